@@ -1,0 +1,81 @@
+// Numbers to digits through look-up tables: what PrintfFormat and the host's JSON writer are built on.
+// Every function writes at `out`, without a terminating zero, and returns the end of what it wrote.
+#pragma once
+
+#include <array>
+#include <bit>
+#include <cstdint>
+#include <cstring>
+
+namespace vesk {
+
+/// The most that any function here may touch behind `out`, digits and scratch together.
+inline constexpr std::size_t kNumberRoom = 24;
+
+extern const std::array<std::array<char, 4>, 10000> kFourDigits;   // "0000" to "9999"
+extern const std::array<std::array<char, 4>, 4096> kThreeHexDigits;  // "000" to "fff", each with a blank behind it
+
+inline char *writeFourDigits(char *out, std::uint32_t value) noexcept {
+  std::memcpy(out, kFourDigits.data()[value].data(), 4);
+  return out + 4;
+}
+
+/// 0 to 9999 without leading zeros.
+inline char *writeUpToFourDigits(char *out, std::uint32_t value) noexcept {
+  std::uint32_t digits;
+  std::memcpy(&digits, kFourDigits.data()[value].data(), 4);
+  // The first digit is the lowest byte. The last one is marked, so that a zero keeps it.
+  const int leadingZeros = std::countr_zero((digits & 0x0F0F0F0Fu) | 0x01000000u) / 8;
+  digits >>= 8 * leadingZeros;
+  std::memcpy(out, &digits, 4);
+  return out + 4 - leadingZeros;
+}
+
+inline char *writeDecimal(char *out, std::uint32_t value) noexcept {
+  if (value < 10'000) return writeUpToFourDigits(out, value);
+  if (value < 100'000'000) return writeFourDigits(writeUpToFourDigits(out, value / 10'000), value % 10'000);
+  out = writeUpToFourDigits(out, value / 100'000'000);
+  return writeFourDigits(writeFourDigits(out, value / 10'000 % 10'000), value % 10'000);
+}
+
+inline char *writeDecimal(char *out, std::uint64_t value) noexcept {
+  if (value <= UINT32_MAX) return writeDecimal(out, static_cast<std::uint32_t>(value));
+  const auto low = static_cast<std::uint32_t>(value % 100'000'000);
+  out = writeDecimal(out, value / 100'000'000);
+  return writeFourDigits(writeFourDigits(out, low / 10'000), low % 10'000);
+}
+
+inline char *writeDecimal(char *out, std::int32_t value) noexcept {
+  const auto bits = static_cast<std::uint32_t>(value);
+  if (value >= 0) return writeDecimal(out, bits);
+  *out = '-';
+  return writeDecimal(out + 1, 0u - bits);
+}
+
+inline char *writeDecimal(char *out, std::int64_t value) noexcept {
+  const auto bits = static_cast<std::uint64_t>(value);
+  if (value >= 0) return writeDecimal(out, bits);
+  *out = '-';
+  return writeDecimal(out + 1, std::uint64_t{0} - bits);
+}
+
+/// Exactly eight lower-case digits.
+inline char *writeHex8(char *out, std::uint32_t value) noexcept {
+  std::memcpy(out, kThreeHexDigits.data()[value >> 20].data(), 4);
+  std::memcpy(out + 3, kThreeHexDigits.data()[value >> 8 & 0xFFF].data(), 4);
+  std::memcpy(out + 6, kThreeHexDigits.data()[value << 4 & 0xFF0].data(), 2);
+  return out + 8;
+}
+
+/// At least `minimum` digits, at most 16, in either case.
+char *writeHex(char *out, std::uint64_t value, unsigned minimum, bool upperCase) noexcept;
+
+/// The most that writeFixed may touch: a double's 309 digits, the point and six decimals.
+inline constexpr std::size_t kFixedRoom = 320;
+
+/// |value| with 3 or 6 decimals, correctly rounded, ties to even, as "%.3f" and "%.6f" print it; `value` is finite.
+/// A value that a float can hold takes the short way: times 1000 (10 bits) or 1000000 (20 bits) its 24 bits stay exact
+/// in a double, so one rounding to integer is the only rounding there is. All else goes through std::to_chars.
+char *writeFixed(char *out, double value, unsigned decimals) noexcept;
+
+}  // namespace vesk

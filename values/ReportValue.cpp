@@ -1,0 +1,197 @@
+// The value tree's memory, look-up, comparison and debug print.
+#include "values/ReportValue.h"
+
+#include <bit>
+#include <memory>
+#include <ostream>
+#include <stdexcept>
+
+namespace vesk {
+
+namespace {
+
+template <class T>
+inline constexpr bool kIsArray = false;
+template <class T>
+inline constexpr bool kIsArray<std::vector<T>> = true;
+
+bool same(float a, float b) noexcept { return std::bit_cast<std::uint32_t>(a) == std::bit_cast<std::uint32_t>(b); }
+bool same(double a, double b) noexcept { return std::bit_cast<std::uint64_t>(a) == std::bit_cast<std::uint64_t>(b); }
+
+template <class T>
+bool same(const T &a, const T &b) noexcept {
+  if constexpr (std::is_same_v<T, std::vector<float>>) {
+    if (a.size() != b.size()) return false;
+    for (std::size_t i = 0; i < a.size(); ++i)
+      if (!same(a[i], b[i])) return false;
+    return true;
+  } else if constexpr (std::is_same_v<T, Dictionary>) {
+    if (a.size() != b.size()) return false;
+    for (const auto &[key, value] : a) {
+      const ReportValue *other = b.find(key.text());
+      if (other == nullptr || !(value == *other)) return false;
+    }
+    return true;
+  } else {
+    return a == b;
+  }
+}
+
+template <class T>
+constexpr const char *typeName() {
+  if constexpr (std::is_same_v<T, std::uint8_t>) return "u8";
+  else if constexpr (std::is_same_v<T, std::uint16_t>) return "u16";
+  else if constexpr (std::is_same_v<T, std::uint32_t>) return "u32";
+  else if constexpr (std::is_same_v<T, std::uint64_t>) return "u64";
+  else if constexpr (std::is_same_v<T, std::int32_t>) return "i32";
+  else if constexpr (std::is_same_v<T, std::int64_t>) return "i64";
+  else if constexpr (std::is_same_v<T, float>) return "float";
+  else if constexpr (std::is_same_v<T, double>) return "double";
+  else return "bool";
+}
+
+template <class T>
+void print(std::ostream &out, const T &value) {
+  if constexpr (std::is_same_v<T, std::string>) {
+    out << '"' << value << '"';
+  } else if constexpr (kIsArray<T>) {
+    out << typeName<typename T::value_type>() << '[';
+    for (std::size_t i = 0; i < value.size(); ++i) out << (i == 0 ? "" : ", ") << value[i];
+    out << ']';
+  } else if constexpr (std::is_same_v<T, Dictionary>) {
+    const char *separator = "{";
+    for (const auto &[key, entry] : value) {
+      out << separator << '"' << key.text() << "\": " << entry;
+      separator = ", ";
+    }
+    out << (value.size() == 0 ? "{}" : "}");
+  } else if constexpr (std::is_same_v<T, bool>) {
+    out << (value ? "true" : "false");
+  } else {
+    out << typeName<T>() << ' ' << +value;
+  }
+}
+
+}  // namespace
+
+Dictionary::Dictionary(std::size_t entries, std::size_t nestedEntries)
+    : entries_(static_cast<Entry *>(::operator new((entries + nestedEntries) * sizeof(Entry)))),
+      capacity_(static_cast<std::uint32_t>(entries)),
+      room_(static_cast<std::uint32_t>(nestedEntries)),
+      owns_(true) {}
+
+Dictionary::Dictionary(InRoomOf room, std::size_t entries) {
+  Dictionary &outer = room.outer;
+  if (entries > outer.room_) {
+    Dictionary own(entries);
+    steal(own);
+    return;
+  }
+  outer.room_ -= static_cast<std::uint32_t>(entries);
+  entries_ = outer.entries_ + outer.capacity_ + outer.room_;
+  capacity_ = static_cast<std::uint32_t>(entries);
+}
+
+Dictionary::Dictionary(Dictionary &&other) {
+  if (other.owns_) {
+    steal(other);
+    return;
+  }
+  Dictionary own(other.size_);
+  for (Entry *entry = other.entries_; entry != other.entries_ + other.size_; ++entry)
+    own.add(entry->key, std::move(entry->value));
+  steal(own);
+}
+
+Dictionary &Dictionary::operator=(Dictionary &&other) {
+  Dictionary taken(std::move(other));
+  release();
+  steal(taken);
+  return *this;
+}
+
+Dictionary::~Dictionary() { release(); }
+
+void Dictionary::steal(Dictionary &other) noexcept {
+  entries_ = std::exchange(other.entries_, nullptr);
+  size_ = std::exchange(other.size_, 0);
+  capacity_ = std::exchange(other.capacity_, 0);
+  room_ = std::exchange(other.room_, 0);
+  owns_ = std::exchange(other.owns_, false);
+}
+
+void Dictionary::release() noexcept {
+  std::destroy_n(entries_, size_);
+  if (owns_) ::operator delete(entries_);
+}
+
+void Dictionary::throwFull() { throw std::length_error("vesk::Dictionary: more entries than it was given room for"); }
+
+Dictionary &Dictionary::addDictionary(Key key, std::size_t entries) {
+  Entry &entry = emplace(key, std::in_place_type<Dictionary>, InRoomOf{*this}, entries);
+  return entry.value.nested();
+}
+
+const ReportValue *Dictionary::find(std::string_view key) const noexcept {
+  for (const auto &[name, value] : *this)
+    if (name.text() == key) return &value;
+  return nullptr;
+}
+
+Dictionary Dictionary::clone() const {
+  Dictionary copy(size_);
+  for (const auto &[key, value] : *this) copy.add(key, value.clone());
+  return copy;
+}
+
+}  // namespace vesk
+
+using vesk::Dictionary;
+
+ReportValue ReportValue::clone() const {
+  return std::visit(
+      []<class T>(const T &value) {
+        if constexpr (std::is_same_v<T, Dictionary>) return ReportValue(value.clone());
+        else return ReportValue(value);
+      },
+      variant_);
+}
+
+std::size_t ReportValue::size() const noexcept {
+  return std::visit(
+      []<class T>(const T &value) -> std::size_t {
+        if constexpr (std::is_same_v<T, Dictionary> || vesk::kIsArray<T>) return value.size();
+        else return 0;
+      },
+      variant_);
+}
+
+const ReportValue *ReportValue::find(std::string_view key) const noexcept {
+  const auto *dictionary = std::get_if<Dictionary>(&variant_);
+  return dictionary == nullptr ? nullptr : dictionary->find(key);
+}
+
+const ReportValue &ReportValue::at(std::string_view key) const {
+  const ReportValue *value = find(key);
+  if (value == nullptr) throw std::out_of_range("ReportValue: no key " + std::string(key));
+  return *value;
+}
+
+ReportValue ReportValue::at(std::size_t index) const {
+  return std::visit(
+      [index]<class T>(const T &value) -> ReportValue {
+        if constexpr (vesk::kIsArray<T>) return ReportValue(value.at(index));
+        else throw std::out_of_range("ReportValue: an index into what is no array");
+      },
+      variant_);
+}
+
+bool operator==(const ReportValue &a, const ReportValue &b) noexcept {
+  if (a.variant_.index() != b.variant_.index()) return false;
+  return std::visit([&b]<class T>(const T &value) { return vesk::same(value, b.as<T>()); }, a.variant_);
+}
+
+std::ostream &operator<<(std::ostream &out, const ReportValue &value) {
+  std::visit([&out](const auto &alternative) { vesk::print(out, alternative); }, value.variant_);
+  return out;
+}

@@ -1,0 +1,172 @@
+// The value tree of one report: numbers that keep their width and signedness, strings, number arrays, dictionaries.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <iosfwd>
+#include <new>
+#include <string>
+#include <string_view>
+#include <type_traits>
+#include <utility>
+#include <variant>
+#include <vector>
+
+class ReportValue;
+
+namespace vesk {
+
+/// A dictionary key: a view of a string literal, made by the compiler, so that it costs nothing and always lives.
+class Key {
+ public:
+  template <std::size_t Size>
+  consteval Key(const char (&literal)[Size]) : text_(literal, Size - 1) {}  // NOLINT: implicit, like a string_view
+
+  constexpr std::string_view text() const noexcept { return text_; }
+
+ private:
+  std::string_view text_;
+};
+
+struct Entry;
+
+/// String keys to values, in the order in which they were added. Each key is added once.
+///
+/// Its entries lie in one block of fixed size. A dictionary that is going to hold dictionaries is given room for their
+/// entries too, behind its own, so that a whole tree is one allocation; nested dictionaries can then not be moved out
+/// without being copied, which the move constructor does.
+class Dictionary {
+ public:
+  Dictionary() noexcept = default;
+  /// Room for `entries` entries, and for `nestedEntries` more that addDictionary() deals out.
+  explicit Dictionary(std::size_t entries, std::size_t nestedEntries = 0);
+  Dictionary(Dictionary &&other);
+  Dictionary &operator=(Dictionary &&other);
+  ~Dictionary();
+
+  /// Adds a value of exactly one of ReportValue's types; std::length_error when the room is used up.
+  template <class T>
+  void add(Key key, T value);
+  /// Adds an empty dictionary with room for `entries` and returns it; the reference lives as long as this dictionary.
+  Dictionary &addDictionary(Key key, std::size_t entries);
+
+  std::size_t size() const noexcept { return size_; }
+  const Entry *begin() const noexcept { return entries_; }
+  const Entry *end() const noexcept;
+  /// The value under `key`, or null.
+  const ReportValue *find(std::string_view key) const noexcept;
+  Dictionary clone() const;
+
+ private:
+  struct InRoomOf {
+    Dictionary &outer;
+  };
+
+ public:
+  /// For addDictionary() alone: nobody else can name the type.
+  Dictionary(InRoomOf outer, std::size_t entries);
+
+ private:
+  template <class... Args>
+  Entry &emplace(Key key, Args &&...args);
+  void steal(Dictionary &other) noexcept;
+  void release() noexcept;
+  [[noreturn]] static void throwFull();
+
+  Entry *entries_ = nullptr;
+  std::uint32_t size_ = 0;
+  std::uint32_t capacity_ = 0;
+  std::uint32_t room_ = 0;  // entries behind entries_ + capacity_ that are still to be dealt out
+  bool owns_ = false;       // false: the block belongs to an outer dictionary
+};
+
+template <class T, class Variant>
+inline constexpr bool kIsAlternative = false;
+template <class T, class... Alternatives>
+inline constexpr bool kIsAlternative<T, std::variant<Alternatives...>> = (std::is_same_v<T, Alternatives> || ...);
+
+}  // namespace vesk
+
+/// One node of the tree. Move-only, with clone() for a copy. No constructor converts, so that a width is always said.
+class ReportValue {
+ public:
+  using Variant =
+      std::variant<std::uint8_t, std::uint16_t, std::uint32_t, std::uint64_t, std::int32_t, std::int64_t, float, double, bool,
+                   std::string, std::vector<std::uint32_t>, std::vector<std::int32_t>, std::vector<float>, vesk::Dictionary>;
+
+  template <class T>
+    requires vesk::kIsAlternative<T, Variant>
+  explicit ReportValue(T value) : variant_(std::in_place_type<T>, std::move(value)) {}
+  /// Makes the alternative T in place.
+  template <class T, class... Args>
+  explicit ReportValue(std::in_place_type_t<T> type, Args &&...args) : variant_(type, std::forward<Args>(args)...) {}
+
+  ReportValue clone() const;
+
+  /// For std::visit.
+  const Variant &variant() const noexcept { return variant_; }
+  template <class T>
+  bool is() const noexcept {
+    return std::holds_alternative<T>(variant_);
+  }
+  /// The value as exactly the type that it has; std::bad_variant_access for any other.
+  template <class T>
+  const T &as() const {
+    return std::get<T>(variant_);
+  }
+
+  /// Entries of a dictionary, elements of an array, 0 for everything else.
+  std::size_t size() const noexcept;
+  /// The value under `key`, or null where there is none or this is no dictionary.
+  const ReportValue *find(std::string_view key) const noexcept;
+  /// The value under `key`; std::out_of_range where find() gives null.
+  const ReportValue &at(std::string_view key) const;
+  /// Element `index` of an array as a value of its own; std::out_of_range beyond its end or where this is no array.
+  ReportValue at(std::size_t index) const;
+
+  /// Same types and same values. The order of dictionary entries does not count; floats are compared by their bits, so
+  /// that a NaN equals its copy.
+  friend bool operator==(const ReportValue &a, const ReportValue &b) noexcept;
+  /// One line for people: {"Count": u32 7, "Name": "x"}.
+  friend std::ostream &operator<<(std::ostream &out, const ReportValue &value);
+
+ private:
+  friend class vesk::Dictionary;  // fills the dictionary that it has just added
+  vesk::Dictionary &nested() { return std::get<vesk::Dictionary>(variant_); }
+
+  Variant variant_;
+};
+
+namespace vesk {
+
+/// One row of a dictionary; decomposes into [key, value].
+struct Entry {
+  Key key;
+  ReportValue value;
+};
+
+// Named widths, for values that come out of arithmetic or a layout field: add("BROWNOUT", u8(flags & 1)).
+constexpr std::uint8_t u8(std::uint8_t value) noexcept { return value; }
+constexpr std::uint16_t u16(std::uint16_t value) noexcept { return value; }
+constexpr std::uint32_t u32(std::uint32_t value) noexcept { return value; }
+constexpr std::uint64_t u64(std::uint64_t value) noexcept { return value; }
+constexpr std::int32_t i32(std::int32_t value) noexcept { return value; }
+constexpr std::int64_t i64(std::int64_t value) noexcept { return value; }
+
+inline const Entry *Dictionary::end() const noexcept { return entries_ + size_; }
+
+template <class... Args>
+Entry &Dictionary::emplace(Key key, Args &&...args) {
+  if (size_ == capacity_) throwFull();
+  Entry &entry = *::new (entries_ + size_) Entry{key, ReportValue(std::forward<Args>(args)...)};
+  ++size_;
+  return entry;
+}
+
+template <class T>
+void Dictionary::add(Key key, T value) {
+  if constexpr (std::is_same_v<T, ReportValue>) emplace(key, std::move(value));
+  else emplace(key, std::in_place_type<T>, std::move(value));
+}
+
+}  // namespace vesk
