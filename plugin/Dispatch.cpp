@@ -17,8 +17,10 @@ struct NamedDecoder {
 };
 
 // One row a decoder, made so that its name and its function cannot disagree.
-#define VESK_DECODER(name) \
-  NamedDecoder { #name, &HIDReportVeskPlugin::name }
+#define VESK_DECODER(name)            \
+  NamedDecoder {                      \
+#name, &HIDReportVeskPlugin::name \
+  }
 constexpr std::array kDecoders = {
     VESK_DECODER(parseVersion),
     VESK_DECODER(parseVersionExtended),
@@ -124,7 +126,8 @@ ReportResult HIDReportVeskPlugin::runParser(const char *report, std::uint32_t re
   return (this->*decoder)();
 }
 
-bool HIDReportVeskPlugin::parseReport(const char *report, std::uint32_t reportID, std::int32_t type, std::int64_t length) {
+bool HIDReportVeskPlugin::parseReport(const char *report, std::uint32_t reportID, std::int32_t type,
+                                      std::int64_t length) {
   useStrings_ = true;  // and it stays true: only parseArgs returns the object to object mode
   const ReportResult result = runParser(report, reportID, type, length);
   return printStrings(std::get_if<DisplayLines>(&result));

@@ -10,8 +10,8 @@
 #include <vector>
 
 #include "plugin/PaddedReport.h"
-#include "values/PluginError.h"
 #include "values/DisplayLines.h"
+#include "values/PluginError.h"
 #include "values/ReportValue.h"
 
 /// What a decoder returns: nothing, the lines of string mode, or the value of object mode. The caller owns it.
@@ -20,7 +20,8 @@ using ReportResult = std::variant<std::monostate, DisplayLines, ReportValue>;
 /// The names of the ten configuration blobs.
 extern "C" __attribute__((visibility("default"))) const char *const blob_names[10];
 
-/// One object decodes one report at a time; it must not be used from two threads at once, but any number of objects may.
+/// One object decodes one report at a time; it must not be used from two threads at once, but any number of objects
+/// may.
 ///
 /// THE READING CONTRACT. Only the two input reports look at the length that comes with them (0x76 is exactly 792 bytes
 /// long, 0x77 exactly 2064, and nothing else is decoded). Every feature decoder reads its fixed offsets whatever the
@@ -63,8 +64,8 @@ class __attribute__((visibility("default"))) HIDReportVeskPlugin {
   /// Sets both flags from the dictionary, a missing key being false. Always true; `error` is never written.
   bool configParser(const Configuration &configuration, PluginError *error);
 
-  // Output helpers. `data` points to `dataLength` little-endian numbers at any address; `format` is a printf format with
-  // one conversion for such a number.
+  // Output helpers. `data` points to `dataLength` little-endian numbers at any address; `format` is a printf format
+  // with one conversion for such a number.
 
   /// Appends lines of eight values each, the last one of what is left; one empty line for no values at all.
   void addArrayUint32(DisplayLines &lines, const void *data, std::uint32_t dataLength, const char *format) const;

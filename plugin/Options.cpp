@@ -14,7 +14,8 @@ constexpr const char *kUseStrings = "UseStrings";
 constexpr std::int64_t kInvalidArgument = static_cast<std::int32_t>(0xE00002C2);  // -536870206
 
 PluginError invalidOption(const std::string &argument) {
-  return {"HIDReportVeskPlugin", kInvalidArgument, {{PluginError::kLocalizedDescription, "Invalid option: " + argument}}};
+  return {
+      "HIDReportVeskPlugin", kInvalidArgument, {{PluginError::kLocalizedDescription, "Invalid option: " + argument}}};
 }
 
 bool isOn(const HIDReportVeskPlugin::Configuration &configuration, const char *key) {
@@ -42,8 +43,8 @@ bool HIDReportVeskPlugin::parseArgs(std::int32_t argc, const char *const *argv) 
   return true;
 }
 
-std::optional<HIDReportVeskPlugin::Configuration> HIDReportVeskPlugin::argsToConfig(const std::vector<std::string> &arguments,
-                                                                                    PluginError *error) const {
+std::optional<HIDReportVeskPlugin::Configuration> HIDReportVeskPlugin::argsToConfig(
+    const std::vector<std::string> &arguments, PluginError *error) const {
   Configuration configuration;
   for (const std::string &argument : arguments) {
     if (argument != "-decimal") {

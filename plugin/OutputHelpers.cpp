@@ -49,9 +49,12 @@ void addLinesByPrintf(DisplayLines &lines, const void *data, std::uint32_t count
 template <class Field>
 void addIntegers(DisplayLines &lines, const void *data, std::uint32_t count, const char *format) {
   const std::string_view text = format;
-  if (text == "%08x ") addLinesAs<"%08x ", Field>(lines, data, count);
-  else if (text == "%14d ") addLinesAs<"%14d ", Field>(lines, data, count);
-  else addLinesByPrintf<Field, typename Field::value_type>(lines, data, count, format);
+  if (text == "%08x ")
+    addLinesAs<"%08x ", Field>(lines, data, count);
+  else if (text == "%14d ")
+    addLinesAs<"%14d ", Field>(lines, data, count);
+  else
+    addLinesByPrintf<Field, typename Field::value_type>(lines, data, count, format);
 }
 
 template <class Field>
@@ -75,8 +78,10 @@ void HIDReportVeskPlugin::addArrayInt32(DisplayLines &lines, const void *data, s
 
 void HIDReportVeskPlugin::addArrayFloat(DisplayLines &lines, const void *data, std::uint32_t dataLength,
                                         const char *format) const {
-  if (std::string_view(format) == "% -13.3f ") vesk::addLinesAs<"% -13.3f ", vesk::F32>(lines, data, dataLength);
-  else vesk::addLinesByPrintf<vesk::F32, double>(lines, data, dataLength, format);
+  if (std::string_view(format) == "% -13.3f ")
+    vesk::addLinesAs<"% -13.3f ", vesk::F32>(lines, data, dataLength);
+  else
+    vesk::addLinesByPrintf<vesk::F32, double>(lines, data, dataLength, format);
 }
 
 ReportValue HIDReportVeskPlugin::arrayWithUint32Array(const void *data, std::uint32_t length) const {

@@ -87,5 +87,9 @@ class DisplayLines::Iterator {
   std::size_t index_ = 0;
 };
 
-inline DisplayLines::Iterator DisplayLines::begin() const noexcept { return {this, 0}; }
-inline DisplayLines::Iterator DisplayLines::end() const noexcept { return {this, size()}; }
+inline DisplayLines::Iterator DisplayLines::begin() const noexcept {
+  return {this, 0};
+}
+inline DisplayLines::Iterator DisplayLines::end() const noexcept {
+  return {this, size()};
+}

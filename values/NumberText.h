@@ -12,7 +12,7 @@ namespace vesk {
 /// The most that any function here may touch behind `out`, digits and scratch together.
 inline constexpr std::size_t kNumberRoom = 24;
 
-extern const std::array<std::array<char, 4>, 10000> kFourDigits;   // "0000" to "9999"
+extern const std::array<std::array<char, 4>, 10000> kFourDigits;     // "0000" to "9999"
 extern const std::array<std::array<char, 4>, 4096> kThreeHexDigits;  // "000" to "fff", each with a blank behind it
 
 inline char *writeFourDigits(char *out, std::uint32_t value) noexcept {

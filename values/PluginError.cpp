@@ -12,8 +12,10 @@ std::string PluginError::description() const {
   std::string line = domain + " error " + std::to_string(code) + ": ";
   for (const char c : localizedDescription()) {
     const auto byte = static_cast<unsigned char>(c);
-    if (byte >= 0x20 && byte != 0x7F) line += c;
-    else line += "\\x" + vesk::formatted<"%02x">(std::uint32_t{byte});
+    if (byte >= 0x20 && byte != 0x7F)
+      line += c;
+    else
+      line += "\\x" + vesk::formatted<"%02x">(std::uint32_t{byte});
   }
   return line;
 }

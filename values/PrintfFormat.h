@@ -1,7 +1,8 @@
-// The subset of printf that the display lines use, parsed, checked and expanded by the compiler, so that a format stands
-// in the code exactly as it is printed. What it writes is what the C library writes, in every locale.
+// The subset of printf that the display lines use, parsed, checked and expanded by the compiler, so that a format
+// stands in the code exactly as it is printed. What it writes is what the C library writes, in every locale.
 //
-// Conversions: %[flags][width][.3|.6][ll](s|i|d|u|x|X|f) with the flags '-', '0' and ' '. Anything else does not compile.
+// Conversions: %[flags][width][.3|.6][ll](s|i|d|u|x|X|f) with the flags '-', '0' and ' '. Anything else does not
+// compile.
 #pragma once
 
 #include <algorithm>
@@ -71,10 +72,14 @@ constexpr Conversion parseConversion(const char *text, std::size_t begin) {
   c.begin = begin;
   std::size_t at = begin + 1;
   for (;; ++at) {
-    if (text[at] == '-') c.left = true;
-    else if (text[at] == '0') c.zeros = true;
-    else if (text[at] == ' ') c.blank = true;
-    else break;
+    if (text[at] == '-')
+      c.left = true;
+    else if (text[at] == '0')
+      c.zeros = true;
+    else if (text[at] == ' ')
+      c.blank = true;
+    else
+      break;
   }
   for (; text[at] >= '0' && text[at] <= '9'; ++at) c.width = c.width * 10 + static_cast<unsigned>(text[at] - '0');
   if (text[at] == '.') {
@@ -130,10 +135,14 @@ inline constexpr bool kIsBlock<TextBlock<Block>> = true;
 
 template <Conversion C, class T>
 std::size_t room(const T &argument) noexcept {
-  if constexpr (kIsBlock<T>) return T::kBlock;
-  else if constexpr (C.kind == 's') return C.width + std::string_view(argument).size();
-  else if constexpr (C.kind == 'f') return C.width + kFixedRoom + 1;
-  else return C.width + kNumberRoom;
+  if constexpr (kIsBlock<T>)
+    return T::kBlock;
+  else if constexpr (C.kind == 's')
+    return C.width + std::string_view(argument).size();
+  else if constexpr (C.kind == 'f')
+    return C.width + kFixedRoom + 1;
+  else
+    return C.width + kNumberRoom;
 }
 
 /// Moves [begin, end) to the right edge of `width` columns that start at `begin`.
@@ -158,10 +167,14 @@ char *writeText(char *out, std::string_view text) noexcept {
 template <Conversion C>
 char *writeFloat(char *out, double value) noexcept {
   char *const begin = out;
-  if (std::signbit(value)) *out++ = '-';
-  else if (C.blank) *out++ = ' ';
-  if (std::isfinite(value)) out = writeFixed(out, value, C.precision);
-  else out = std::copy_n(std::isnan(value) ? "nan" : "inf", 3, out);
+  if (std::signbit(value))
+    *out++ = '-';
+  else if (C.blank)
+    *out++ = ' ';
+  if (std::isfinite(value))
+    out = writeFixed(out, value, C.precision);
+  else
+    out = std::copy_n(std::isnan(value) ? "nan" : "inf", 3, out);
   if constexpr (!C.left) return alignRight(begin, out, C.width);
   for (; out < begin + C.width; ++out) *out = ' ';
   return out;
@@ -169,13 +182,18 @@ char *writeFloat(char *out, double value) noexcept {
 
 template <Conversion C, class T>
 char *writeInteger(char *out, T value) noexcept {
-  static_assert(std::is_integral_v<T> && (sizeof(T) == 8) == C.longLong, "a 64-bit number is printed with ll, no other is");
+  static_assert(std::is_integral_v<T> && (sizeof(T) == 8) == C.longLong,
+                "a 64-bit number is printed with ll, no other is");
   using Unsigned = std::conditional_t<C.longLong, std::uint64_t, std::uint32_t>;
   const auto bits = static_cast<Unsigned>(value);
-  if constexpr (C.kind == 'x' && C.width == 8) return writeHex8(out, bits);
-  else if constexpr (C.kind == 'x' || C.kind == 'X') return writeHex(out, bits, C.width == 0 ? 1 : C.width, C.kind == 'X');
-  else if constexpr (C.kind == 'u') return alignRight(out, writeDecimal(out, bits), C.width);
-  else return alignRight(out, writeDecimal(out, static_cast<std::make_signed_t<Unsigned>>(bits)), C.width);
+  if constexpr (C.kind == 'x' && C.width == 8)
+    return writeHex8(out, bits);
+  else if constexpr (C.kind == 'x' || C.kind == 'X')
+    return writeHex(out, bits, C.width == 0 ? 1 : C.width, C.kind == 'X');
+  else if constexpr (C.kind == 'u')
+    return alignRight(out, writeDecimal(out, bits), C.width);
+  else
+    return alignRight(out, writeDecimal(out, static_cast<std::make_signed_t<Unsigned>>(bits)), C.width);
 }
 
 template <Conversion C, class T>
@@ -213,7 +231,8 @@ struct Format {
     static_assert(sizeof...(Args) == format::kCount<F>, "as many arguments as conversions");
     return [&]<std::size_t... I>(std::index_sequence<I...>) {
       return (format::kLength<F> + ... + format::room<format::kConversions<F>[I]>(format::plain(args)));
-    }(std::index_sequence_for<Args...>());
+    }
+    (std::index_sequence_for<Args...>());
   }
 
   /// REQUIRES: room(args...) writable bytes. Returns the end of the text; no terminating zero.
@@ -223,7 +242,8 @@ struct Format {
       ((out = format::writeLiteral<F, I>(out),
         out = format::writeConversion<format::kConversions<F>[I]>(out, format::plain(args))),
        ...);
-    }(std::index_sequence_for<Args...>());
+    }
+    (std::index_sequence_for<Args...>());
     return format::writeLiteral<F, sizeof...(Args)>(out);
   }
 };

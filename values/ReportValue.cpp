@@ -15,8 +15,12 @@ inline constexpr bool kIsArray = false;
 template <class T>
 inline constexpr bool kIsArray<std::vector<T>> = true;
 
-bool same(float a, float b) noexcept { return std::bit_cast<std::uint32_t>(a) == std::bit_cast<std::uint32_t>(b); }
-bool same(double a, double b) noexcept { return std::bit_cast<std::uint64_t>(a) == std::bit_cast<std::uint64_t>(b); }
+bool same(float a, float b) noexcept {
+  return std::bit_cast<std::uint32_t>(a) == std::bit_cast<std::uint32_t>(b);
+}
+bool same(double a, double b) noexcept {
+  return std::bit_cast<std::uint64_t>(a) == std::bit_cast<std::uint64_t>(b);
+}
 
 template <class T>
 bool same(const T &a, const T &b) noexcept {
@@ -39,15 +43,24 @@ bool same(const T &a, const T &b) noexcept {
 
 template <class T>
 constexpr const char *typeName() {
-  if constexpr (std::is_same_v<T, std::uint8_t>) return "u8";
-  else if constexpr (std::is_same_v<T, std::uint16_t>) return "u16";
-  else if constexpr (std::is_same_v<T, std::uint32_t>) return "u32";
-  else if constexpr (std::is_same_v<T, std::uint64_t>) return "u64";
-  else if constexpr (std::is_same_v<T, std::int32_t>) return "i32";
-  else if constexpr (std::is_same_v<T, std::int64_t>) return "i64";
-  else if constexpr (std::is_same_v<T, float>) return "float";
-  else if constexpr (std::is_same_v<T, double>) return "double";
-  else return "bool";
+  if constexpr (std::is_same_v<T, std::uint8_t>)
+    return "u8";
+  else if constexpr (std::is_same_v<T, std::uint16_t>)
+    return "u16";
+  else if constexpr (std::is_same_v<T, std::uint32_t>)
+    return "u32";
+  else if constexpr (std::is_same_v<T, std::uint64_t>)
+    return "u64";
+  else if constexpr (std::is_same_v<T, std::int32_t>)
+    return "i32";
+  else if constexpr (std::is_same_v<T, std::int64_t>)
+    return "i64";
+  else if constexpr (std::is_same_v<T, float>)
+    return "float";
+  else if constexpr (std::is_same_v<T, double>)
+    return "double";
+  else
+    return "bool";
 }
 
 template <class T>
@@ -110,7 +123,9 @@ Dictionary &Dictionary::operator=(Dictionary &&other) {
   return *this;
 }
 
-Dictionary::~Dictionary() { release(); }
+Dictionary::~Dictionary() {
+  release();
+}
 
 void Dictionary::steal(Dictionary &other) noexcept {
   entries_ = std::exchange(other.entries_, nullptr);
@@ -125,7 +140,9 @@ void Dictionary::release() noexcept {
   if (owns_) ::operator delete(entries_);
 }
 
-void Dictionary::throwFull() { throw std::length_error("vesk::Dictionary: more entries than it was given room for"); }
+void Dictionary::throwFull() {
+  throw std::length_error("vesk::Dictionary: more entries than it was given room for");
+}
 
 Dictionary &Dictionary::addDictionary(Key key, std::size_t entries) {
   Entry &entry = emplace(key, std::in_place_type<Dictionary>, InRoomOf{*this}, entries);
@@ -151,8 +168,10 @@ using vesk::Dictionary;
 ReportValue ReportValue::clone() const {
   return std::visit(
       []<class T>(const T &value) {
-        if constexpr (std::is_same_v<T, Dictionary>) return ReportValue(value.clone());
-        else return ReportValue(value);
+        if constexpr (std::is_same_v<T, Dictionary>)
+          return ReportValue(value.clone());
+        else
+          return ReportValue(value);
       },
       variant_);
 }
@@ -160,8 +179,10 @@ ReportValue ReportValue::clone() const {
 std::size_t ReportValue::size() const noexcept {
   return std::visit(
       []<class T>(const T &value) -> std::size_t {
-        if constexpr (std::is_same_v<T, Dictionary> || vesk::kIsArray<T>) return value.size();
-        else return 0;
+        if constexpr (std::is_same_v<T, Dictionary> || vesk::kIsArray<T>)
+          return value.size();
+        else
+          return 0;
       },
       variant_);
 }
@@ -180,8 +201,10 @@ const ReportValue &ReportValue::at(std::string_view key) const {
 ReportValue ReportValue::at(std::size_t index) const {
   return std::visit(
       [index]<class T>(const T &value) -> ReportValue {
-        if constexpr (vesk::kIsArray<T>) return ReportValue(value.at(index));
-        else throw std::out_of_range("ReportValue: an index into what is no array");
+        if constexpr (vesk::kIsArray<T>)
+          return ReportValue(value.at(index));
+        else
+          throw std::out_of_range("ReportValue: an index into what is no array");
       },
       variant_);
 }

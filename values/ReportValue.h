@@ -90,12 +90,12 @@ inline constexpr bool kIsAlternative<T, std::variant<Alternatives...>> = (std::i
 /// One node of the tree. Move-only, with clone() for a copy. No constructor converts, so that a width is always said.
 class ReportValue {
  public:
-  using Variant =
-      std::variant<std::uint8_t, std::uint16_t, std::uint32_t, std::uint64_t, std::int32_t, std::int64_t, float, double, bool,
-                   std::string, std::vector<std::uint32_t>, std::vector<std::int32_t>, std::vector<float>, vesk::Dictionary>;
+  using Variant = std::variant<std::uint8_t, std::uint16_t, std::uint32_t, std::uint64_t, std::int32_t, std::int64_t,
+                               float, double, bool, std::string, std::vector<std::uint32_t>, std::vector<std::int32_t>,
+                               std::vector<float>, vesk::Dictionary>;
 
   template <class T>
-    requires vesk::kIsAlternative<T, Variant>
+  requires vesk::kIsAlternative<T, Variant>
   explicit ReportValue(T value) : variant_(std::in_place_type<T>, std::move(value)) {}
   /// Makes the alternative T in place.
   template <class T, class... Args>
@@ -146,14 +146,28 @@ struct Entry {
 };
 
 // Named widths, for values that come out of arithmetic or a layout field: add("BROWNOUT", u8(flags & 1)).
-constexpr std::uint8_t u8(std::uint8_t value) noexcept { return value; }
-constexpr std::uint16_t u16(std::uint16_t value) noexcept { return value; }
-constexpr std::uint32_t u32(std::uint32_t value) noexcept { return value; }
-constexpr std::uint64_t u64(std::uint64_t value) noexcept { return value; }
-constexpr std::int32_t i32(std::int32_t value) noexcept { return value; }
-constexpr std::int64_t i64(std::int64_t value) noexcept { return value; }
+constexpr std::uint8_t u8(std::uint8_t value) noexcept {
+  return value;
+}
+constexpr std::uint16_t u16(std::uint16_t value) noexcept {
+  return value;
+}
+constexpr std::uint32_t u32(std::uint32_t value) noexcept {
+  return value;
+}
+constexpr std::uint64_t u64(std::uint64_t value) noexcept {
+  return value;
+}
+constexpr std::int32_t i32(std::int32_t value) noexcept {
+  return value;
+}
+constexpr std::int64_t i64(std::int64_t value) noexcept {
+  return value;
+}
 
-inline const Entry *Dictionary::end() const noexcept { return entries_ + size_; }
+inline const Entry *Dictionary::end() const noexcept {
+  return entries_ + size_;
+}
 
 template <class... Args>
 Entry &Dictionary::emplace(Key key, Args &&...args) {
@@ -165,8 +179,10 @@ Entry &Dictionary::emplace(Key key, Args &&...args) {
 
 template <class T>
 void Dictionary::add(Key key, T value) {
-  if constexpr (std::is_same_v<T, ReportValue>) emplace(key, std::move(value));
-  else emplace(key, std::in_place_type<T>, std::move(value));
+  if constexpr (std::is_same_v<T, ReportValue>)
+    emplace(key, std::move(value));
+  else
+    emplace(key, std::in_place_type<T>, std::move(value));
 }
 
 }  // namespace vesk
