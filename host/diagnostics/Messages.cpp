@@ -1,0 +1,63 @@
+// Printing and counting of messages.
+#include "host/diagnostics/Messages.h"
+
+#include <algorithm>
+
+#include "values/PrintfFormat.h"
+
+namespace vesk::host {
+
+std::string_view severityName(Severity severity) {
+  constexpr std::string_view kNames[] = {"note", "warning", "error"};
+  return kNames[static_cast<std::size_t>(severity)];
+}
+
+Severity Messages::severityOf(const MessageKind &kind) const {
+  return kind.lenient && options_.lenient ? std::min(kind.severity, Severity::kWarning) : kind.severity;
+}
+
+bool Messages::shows(Severity severity) const {
+  if (severity == Severity::kError) return true;
+  if (severity == Severity::kNote) return options_.verbose;
+  return !options_.quiet;
+}
+
+Severity Messages::add(Message message) {
+  const Severity severity = severityOf(*message.kind);
+  if (severity == message.kind->severity) exitCode_ = std::max(exitCode_, message.kind->exitCode);
+  const auto [entry, isNew] = index_.try_emplace({message.file, message.kind->code}, kept_.size());
+  if (isNew || options_.verbose) {
+    if (shows(severity)) print(message, severity, message.text);
+  }
+  if (isNew) kept_.push_back({std::move(message), severity});
+  else ++kept_[entry->second].count;
+  return severity;
+}
+
+void Messages::finishFile(std::string_view file) {
+  if (options_.verbose) return;  // each one was printed
+  for (const Kept &kept : kept_)
+    if (kept.first.file == file && kept.count > 1 && shows(kept.severity)) {
+      const Message total{kept.first.kind, kept.first.file, {}, {}, {}};
+      print(total, kept.severity, std::to_string(kept.count - 1) + " more of this kind (" + std::string(kept.first.kind->code) + ")");
+    }
+}
+
+void Messages::print(const Message &message, Severity severity, std::string_view text) const {
+  std::string line;
+  if (!message.file.empty()) line += message.file + ":";
+  if (const std::string place = message.place.text(); !place.empty()) line += place + ":";
+  if (!line.empty()) line += ' ';
+  const char *colour = severity == Severity::kError ? "\x1b[1;31m" : severity == Severity::kWarning ? "\x1b[1;35m" : "\x1b[1;36m";
+  if (options_.colour) line += colour;
+  line += severityName(severity);
+  line += ':';
+  if (options_.colour) line += "\x1b[0m";
+  line += ' ';
+  if (message.reportId) line += formatted<"0x%02X: ">(*message.reportId);
+  line += text;
+  line += '\n';
+  std::fwrite(line.data(), 1, line.size(), stream_);
+}
+
+}  // namespace vesk::host

@@ -1,0 +1,69 @@
+// Writing whole buffers, and the rename that makes a file appear.
+#include "host/output/OutputFile.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <utility>
+
+namespace vesk::host {
+
+OutputFile::OutputFile(const std::string &path) : name_(path == "-" ? "(standard output)" : path) {
+  if (path == "-") return;
+  struct stat existing {};
+  // What is there and no regular file (a device, a FIFO) cannot be replaced and is written to as it is.
+  if (::stat(path.c_str(), &existing) == 0 && !S_ISREG(existing.st_mode)) {
+    fd_ = ::open(path.c_str(), O_WRONLY | O_CLOEXEC);
+    if (fd_ < 0) fail("cannot be opened");
+    return;
+  }
+  path_ = path;
+  temporary_ = path + ".XXXXXX";
+  fd_ = ::mkostemp(temporary_.data(), O_CLOEXEC);
+  if (fd_ < 0) {
+    temporary_.clear();
+    fail("cannot be created");
+  }
+  const mode_t mask = ::umask(0);
+  ::umask(mask);
+  ::fchmod(fd_, 0666 & ~mask);
+}
+
+OutputFile::~OutputFile() {
+  if (fd_ > STDERR_FILENO) ::close(fd_);
+  if (!temporary_.empty()) ::unlink(temporary_.c_str());
+}
+
+void OutputFile::write(std::string_view bytes) {
+  while (!bytes.empty()) {
+    const ssize_t written = ::write(fd_, bytes.data(), bytes.size());
+    if (written >= 0) {
+      bytes.remove_prefix(static_cast<std::size_t>(written));
+    } else if (errno == EPIPE) {
+      throw PipeClosed();
+    } else if (errno != EINTR) {
+      fail("cannot be written");
+    }
+  }
+}
+
+void OutputFile::commit() {
+  if (fd_ <= STDERR_FILENO) return;
+  if (!temporary_.empty() && ::fsync(fd_) != 0) fail("cannot be written");
+  if (::close(std::exchange(fd_, -1)) != 0) fail("cannot be written");
+  if (temporary_.empty()) return;
+  if (::rename(temporary_.c_str(), path_.c_str()) != 0) fail("cannot take its name");
+  temporary_.clear();
+}
+
+bool OutputFile::isTerminal() const { return ::isatty(fd_) == 1; }
+
+void OutputFile::fail(const char *what) const {
+  throw OutputError(name_ + ": " + what + ": " + std::strerror(errno));
+}
+
+}  // namespace vesk::host

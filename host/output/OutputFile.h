@@ -1,0 +1,44 @@
+// Where output goes: standard output, or a file that appears whole or not at all.
+#pragma once
+
+#include <stdexcept>
+#include <string>
+#include <string_view>
+
+namespace vesk::host {
+
+/// Output that could not be written; what() names the file and the reason.
+class OutputError : public std::runtime_error {
+  using std::runtime_error::runtime_error;
+};
+
+/// Whoever read our output has stopped reading, which is no error.
+class PipeClosed : public std::exception {};
+
+class OutputFile {
+ public:
+  /// Standard output for "-". Otherwise a new file beside `path` that takes its name in commit(). Throws OutputError.
+  explicit OutputFile(const std::string &path);
+  /// Removes what was not committed.
+  ~OutputFile();
+  OutputFile(const OutputFile &) = delete;
+  OutputFile &operator=(const OutputFile &) = delete;
+
+  /// Writes all of it. Throws OutputError or PipeClosed.
+  void write(std::string_view bytes);
+  /// Gives the file its name; what was written before is on disk then. Throws OutputError.
+  void commit();
+
+  const std::string &name() const { return name_; }
+  bool isTerminal() const;
+
+ private:
+  [[noreturn]] void fail(const char *what) const;
+
+  std::string name_;
+  std::string path_;       // empty for standard output
+  std::string temporary_;  // empty once it was renamed
+  int fd_ = 1;
+};
+
+}  // namespace vesk::host
