@@ -41,6 +41,7 @@ inline constexpr MessageKind kNothingDecoded{"nothing-decoded", Severity::kError
 inline constexpr MessageKind kUnterminatedText{"unterminated-text", Severity::kWarning, kExitOk};
 inline constexpr MessageKind kTrailingBytes{"trailing-bytes", Severity::kNote, kExitOk};
 inline constexpr MessageKind kLostReports{"lost-reports", Severity::kWarning, kExitOk};
+inline constexpr MessageKind kLossTotal{"lost-reports-total", Severity::kWarning, kExitOk};
 // The kinds that every input can give.
 inline constexpr MessageKind kUnreadable{"unreadable", Severity::kError, kExitUnreadable};
 inline constexpr MessageKind kUnknownInput{"unknown-input", Severity::kError, kExitUnreadable};
