@@ -86,7 +86,8 @@ class Case(unittest.TestCase):
         self.assertEqual(bad, [])
 
 
-def main(case, limit=120):
+def main(case, limit=120, cpus=1, files=()):
+    """Boots, unless told to reuse, and runs the checks of the calling file; `files` are ("here", "/in/the/guest")."""
     global results
     case = pathlib.Path(case).resolve()
     parser = argparse.ArgumentParser(description=__doc__)
@@ -98,8 +99,11 @@ def main(case, limit=120):
     results = options.results
     programs.update({pathlib.Path(p).name: p for p in options.programs})
     if not options.reuse:
-        boot = [case.parent.parent / "boot", "--cache", options.cache, "--results", results, "--limit", str(limit)]
-        code = subprocess.run([*boot, "--script", case.with_suffix(".sh"), *options.programs]).returncode
+        command = [case.parent.parent / "boot", "--script", case.with_suffix(".sh"), "--cache", options.cache]
+        command += ["--results", results, "--limit", str(limit), "--cpus", str(cpus)]
+        for here, there in files:
+            command += ["--file", f"{here}={there}"]
+        code = subprocess.run([*command, *options.programs]).returncode
         if code == CANNOT_RUN and not os.environ.get("VESK_KERNEL_REQUIRED"):
             sys.exit(CANNOT_RUN)
         if code != 0:

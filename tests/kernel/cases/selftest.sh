@@ -48,7 +48,7 @@ waitLog plain 'streamed 100 '
 signalStep stopped CONT
 finish stopped
 background skipping -- probe read "$(node plain)" 3 1000
-waitLines skipping 1
+waitOpen plain
 tell plain 'send 76' 'skip 76 5' 'send 76' 'send 76'
 finish skipping
 

@@ -36,12 +36,20 @@ node() {
 tell() {
     local name="$1"
     shift
-    printf '%s\n' "$@" >"/run/$name.control"
+    if grep '^[0-9]* error ' "/out/$name.log" >&2; then die "controller $name has ended"; fi
+    printf '%s\n' "$@" 1<>"/run/$name.control" # opened both ways, which never waits for a reader
 }
 
 # waitLog NAME PATTERN [COUNT]: until that many lines of its log match.
 logHolds() { [ "$(grep -c "$2" "/out/$1.log")" -ge "$3" ]; }
 waitLog() { waitFor 10 "'$2' in the log of $1" logHolds "$1" "$2" "${3:-1}"; }
+
+# waitOpen NAME: until a reader has its node open, and a little longer, because the kernel tells the device first.
+isOpen() { [ "$(grep -oE ' (open|close|stop)$' "/out/$1.log" | tail -n 1)" = ' open' ]; }
+waitOpen() {
+    waitFor 10 "a reader of $1" isOpen "$1"
+    sleep 0.1
+}
 
 # step NAME [--user U] [--limit S] [--tty CxR] -- COMMAND...: never fails; what came out is in /out/steps/NAME.
 step() {
