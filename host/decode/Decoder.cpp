@@ -9,7 +9,9 @@ namespace vesk::host {
 
 namespace {
 
-std::string bytesText(std::size_t count) { return std::to_string(count) + (count == 1 ? " byte" : " bytes"); }
+std::string bytesText(std::size_t count) {
+  return std::to_string(count) + (count == 1 ? " byte" : " bytes");
+}
 
 }  // namespace
 
@@ -30,11 +32,12 @@ void Decoder::judgeLength(const SourceReport &report) {
   if (known == nullptr) {
     find(kUnknownReport, "no report of the controller has this ID");
   } else if (known->type != report.type) {
-    find(kWrongType, "handed over as " + std::string(typeName(report.type)) + " report, but " + std::string(known->name) +
-                         " is a report of type " + std::string(typeName(known->type)));
+    find(kWrongType, "handed over as " + std::string(typeName(report.type)) + " report, but " +
+                         std::string(known->name) + " is a report of type " + std::string(typeName(known->type)));
   } else if (known->length == KnownReport::Length::kExact) {
     if (length != known->layoutSize)
-      find(kWrongLength, bytesText(length) + " long, exactly " + std::to_string(known->layoutSize) + " expected; not decoded");
+      find(kWrongLength,
+           bytesText(length) + " long, exactly " + std::to_string(known->layoutSize) + " expected; not decoded");
   } else if (length < known->layoutSize) {
     find(kShortReport, bytesText(length) + " long, " + std::to_string(known->layoutSize) +
                            " expected; the missing ones are read as zero");
@@ -77,7 +80,8 @@ const Decoded &Decoder::decode(const SourceReport &report) {
   const bool nothing = !decoded_.value && !decoded_.lines;
   bool said = false;
   for (const Finding &finding : decoded_.findings) said = said || finding.severity == Severity::kError;
-  if (nothing && !said && (options_.value || options_.lines)) find(kNothingDecoded, "the decoder gave nothing: the text is not UTF-8");
+  if (nothing && !said && (options_.value || options_.lines))
+    find(kNothingDecoded, "the decoder gave nothing: the text is not UTF-8");
   return decoded_;
 }
 

@@ -24,7 +24,9 @@ Pipeline::Pipeline(const Options &options, const Filter &filter, Formatter &form
       messages_(messages),
       decoder_({formatter.wantsLines(), formatter.wantsValue(), options.decimal, options.lenient}) {}
 
-void Pipeline::begin() { formatter_.begin(buffer_); }
+void Pipeline::begin() {
+  formatter_.begin(buffer_);
+}
 
 void Pipeline::report(const SourceReport &report) {
   countLoss(report);
@@ -46,13 +48,18 @@ void Pipeline::countLoss(const SourceReport &report) {
                std::to_string(gap->lost) + " lost"});
 }
 
-void Pipeline::message(Message message) { messages_.add(std::move(message)); }
+void Pipeline::message(Message message) {
+  messages_.add(std::move(message));
+}
 
 void Pipeline::finishFile(std::string_view file) {
   messages_.finishFile(file);
   const LossCounter::Total total = std::exchange(losses_, {}).total();
   if (total.gaps > 1)
-    message({&kLossTotal, std::string(file), {}, {},
+    message({&kLossTotal,
+             std::string(file),
+             {},
+             {},
              std::to_string(total.lost) + " reports lost in " + std::to_string(total.gaps) + " gaps"});
 }
 

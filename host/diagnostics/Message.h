@@ -1,4 +1,5 @@
-// What the host has to say about its inputs: each kind with a fixed code, a severity and the exit code that it calls for.
+// What the host has to say about its inputs: each kind with a fixed code, a severity and the exit code that it calls
+// for.
 #pragma once
 
 #include <cstdint>
@@ -47,6 +48,7 @@ inline constexpr MessageKind kUnreadable{"unreadable", Severity::kError, kExitUn
 inline constexpr MessageKind kUnknownInput{"unknown-input", Severity::kError, kExitUnreadable};
 inline constexpr MessageKind kBadInput{"bad-input", Severity::kError, kExitFindings};
 inline constexpr MessageKind kNoReports{"no-reports", Severity::kError, kExitFindings};
+inline constexpr MessageKind kInputKind{"input-kind", Severity::kNote, kExitOk};
 
 struct Message {
   const MessageKind *kind = nullptr;

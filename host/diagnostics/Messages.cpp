@@ -29,8 +29,10 @@ Severity Messages::add(Message message) {
   if (isNew || options_.verbose) {
     if (shows(severity)) print(message, severity, message.text);
   }
-  if (isNew) kept_.push_back({std::move(message), severity});
-  else ++kept_[entry->second].count;
+  if (isNew)
+    kept_.push_back({std::move(message), severity});
+  else
+    ++kept_[entry->second].count;
   return severity;
 }
 
@@ -39,7 +41,8 @@ void Messages::finishFile(std::string_view file) {
   for (const Kept &kept : kept_)
     if (kept.first.file == file && kept.count > 1 && shows(kept.severity)) {
       const Message total{kept.first.kind, kept.first.file, {}, {}, {}};
-      print(total, kept.severity, std::to_string(kept.count - 1) + " more of this kind (" + std::string(kept.first.kind->code) + ")");
+      print(total, kept.severity,
+            std::to_string(kept.count - 1) + " more of this kind (" + std::string(kept.first.kind->code) + ")");
     }
 }
 
@@ -48,7 +51,9 @@ void Messages::print(const Message &message, Severity severity, std::string_view
   if (!message.file.empty()) line += message.file + ":";
   if (const std::string place = message.place.text(); !place.empty()) line += place + ":";
   if (!line.empty()) line += ' ';
-  const char *colour = severity == Severity::kError ? "\x1b[1;31m" : severity == Severity::kWarning ? "\x1b[1;35m" : "\x1b[1;36m";
+  const char *colour = severity == Severity::kError     ? "\x1b[1;31m"
+                       : severity == Severity::kWarning ? "\x1b[1;35m"
+                                                        : "\x1b[1;36m";
   if (options_.colour) line += colour;
   line += severityName(severity);
   line += ':';

@@ -77,7 +77,8 @@ class GzipBytes : public RawBytes {
         insideMember_ = false;
         inflateReset(&stream_);
       } else if (status != Z_OK && status != Z_BUF_ERROR) {
-        throw InputError(std::string("the gzip data are damaged: ") + (stream_.msg != nullptr ? stream_.msg : "unknown error"));
+        throw InputError(std::string("the gzip data are damaged: ") +
+                         (stream_.msg != nullptr ? stream_.msg : "unknown error"));
       }
     }
     return size - stream_.avail_out;

@@ -40,8 +40,8 @@ class ByteSource {
   /// Bytes that were taken so far, which is the offset of the next one.
   std::uint64_t offset() const { return taken_; }
 
-  /// All bytes that are at hand, at least `wanted` of them unless the input ends before. REQUIRES: wanted <= kMostAhead.
-  /// The view lives until the next call of anything but offset().
+  /// All bytes that are at hand, at least `wanted` of them unless the input ends before. REQUIRES: wanted <=
+  /// kMostAhead. The view lives until the next call of anything but offset().
   std::string_view peek(std::size_t wanted = 1);
   /// Takes bytes that peek() has shown.
   void skip(std::size_t size);

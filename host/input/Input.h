@@ -21,7 +21,7 @@ class ReadSink {
 
 /// What the user can say about how inputs are to be read.
 struct ReadOptions {
-  bool split = false;                  // raw binary holds many reports one behind the other
+  bool split = false;                    // raw binary holds many reports one behind the other
   std::optional<ReportType> forcedType;  // the type of reports whose input does not tell it
 };
 

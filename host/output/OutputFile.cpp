@@ -60,7 +60,9 @@ void OutputFile::commit() {
   temporary_.clear();
 }
 
-bool OutputFile::isTerminal() const { return ::isatty(fd_) == 1; }
+bool OutputFile::isTerminal() const {
+  return ::isatty(fd_) == 1;
+}
 
 void OutputFile::fail(const char *what) const {
   throw OutputError(name_ + ": " + what + ": " + std::strerror(errno));

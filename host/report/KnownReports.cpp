@@ -26,14 +26,17 @@ constexpr KnownReport kReports[] = {
     {0xE3, kFeature, "open-short-result", 57, kAtLeast, "parseOpenShortTest", "Open/short test result"},
     {0xE4, kFeature, "open-short-data-d", 401, kAtLeast, "parseOpenShortData", "Open/short test data, D-SCAN"},
     {0xE5, kFeature, "open-short-data-p", 401, kAtLeast, "parseOpenShortData", "Open/short test data, P-SCAN"},
-    {0xEA, kFeature, "black-box-report-2", 1023, kAtLeast, "parseBlackBoxFullReport", "Black box full report, second ID"},
+    {0xEA, kFeature, "black-box-report-2", 1023, kAtLeast, "parseBlackBoxFullReport",
+     "Black box full report, second ID"},
     {0xEC, kFeature, "noisy-pixel-thresholds", 193, kAtLeast, "parserNoisyPixelThresholdsRequest",
      "Noisy-pixel thresholds"},
 };
 
 }  // namespace
 
-std::span<const KnownReport> knownReports() { return kReports; }
+std::span<const KnownReport> knownReports() {
+  return kReports;
+}
 
 const KnownReport *findReport(std::uint32_t id) {
   for (const KnownReport &report : kReports)

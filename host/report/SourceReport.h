@@ -34,15 +34,15 @@ struct Place {
 
 /// Borrows everything: the views live as long as the call that hands it over.
 struct SourceReport {
-  std::string_view bytes;      // the report ID first
-  std::uint32_t id = 0;        // what was asked for; the first byte where nothing says otherwise
+  std::string_view bytes;  // the report ID first
+  std::uint32_t id = 0;    // what was asked for; the first byte where nothing says otherwise
   ReportType type = ReportType::kFeature;
-  bool typeGuessed = false;    // nothing in the input said the type, so the ID chose it
-  std::string_view file;       // as the user named it
+  bool typeGuessed = false;  // nothing in the input said the type, so the ID chose it
+  std::string_view file;     // as the user named it
   Place place;
-  std::uint64_t index = 0;     // of the report in its file, from 0
+  std::uint64_t index = 0;             // of the report in its file, from 0
   std::optional<std::int64_t> timeNs;  // nanoseconds since the input's own zero
-  std::string_view device;     // "1.7" for bus and address, "0" for a recording's device index; empty where unknown
+  std::string_view device;  // "1.7" for bus and address, "0" for a recording's device index; empty where unknown
   std::optional<std::uint32_t> vendorProduct;  // vendor << 16 | product, where the input tells
 };
 

@@ -1,0 +1,35 @@
+// Output options and the formatter that they ask for.
+#include "host/commands/OutputOptions.h"
+
+namespace vesk::host {
+
+void OutputOptions::addTo(CLI::App &command) {
+  std::vector<std::string> names;
+  std::string description = "output form:";
+  for (const OutputKind &kind : outputKinds()) {
+    names.emplace_back(kind.name);
+    description += (names.size() == 1 ? " " : ", ") + names.back();
+  }
+  command.add_option("-o,--output", form, description)
+      ->check(CLI::IsMember(names))
+      ->type_name("FORM")
+      ->capture_default_str()
+      ->group("Output");
+  command
+      .add_option("-O,--output-file", file, "write to FILE, which appears whole or not at all; - is standard output")
+      ->type_name("FILE")
+      ->group("Output");
+  command.add_flag("--decimal", decimal, "number arrays in decimal (also -decimal)")->group("Output");
+  command.add_flag("--headers", format.headers, "text: a line before each report that says where it comes from")
+      ->group("Output");
+  command.add_flag("--with-lines", format.withLines, "json, jsonl: the display lines too")->group("Output");
+  command.add_flag("--with-bytes", format.withBytes, "json, jsonl: the report's bytes too")->group("Output");
+  command.add_flag("--lenient", lenient, "a report shorter than its layout is a warning, not an error")
+      ->group("Output");
+}
+
+std::unique_ptr<Formatter> OutputOptions::makeFormatter() const {
+  return findOutputKind(form)->make(format);
+}
+
+}  // namespace vesk::host

@@ -1,0 +1,27 @@
+// The options that say in which form and where to decoded reports go; the same for every command that decodes.
+#pragma once
+
+#include <CLI/CLI.hpp>
+#include <memory>
+#include <string>
+
+#include "host/decode/Pipeline.h"
+#include "host/output/Formatter.h"
+
+namespace vesk::host {
+
+struct OutputOptions {
+  std::string form = "text";
+  std::string file = "-";
+  bool decimal = false;
+  bool lenient = false;
+  FormatOptions format;
+
+  /// Adds -o, -O, -decimal and the others to a command, as one group.
+  void addTo(CLI::App &command);
+
+  std::unique_ptr<Formatter> makeFormatter() const;
+  Pipeline::Options pipeline() const { return {decimal, lenient, false}; }
+};
+
+}  // namespace vesk::host

@@ -1,0 +1,77 @@
+// vesk-report: decodes the Vesk controller's reports from recordings and live devices.
+#include <unistd.h>
+
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <exception>
+
+#include "host/commands/Command.h"
+#include "host/output/OutputFile.h"
+
+namespace {
+
+using namespace vesk::host;
+
+constexpr const char *kExitCodes =
+    "Exit codes, the highest that applies:\n"
+    "  0  all well\n"
+    "  2  wrong usage\n"
+    "  3  an input or a device could not be opened or read\n"
+    "  4  a report could not be decoded as it should be\n"
+    "  5  output could not be written\n";
+
+/// The arguments behind the program's name. "-decimal" is the plug-in's own spelling of an option and would be read as
+/// a bundle of one-letter options.
+std::vector<std::string> takeArguments(int argc, char **argv) {
+  std::vector<std::string> arguments(argv + std::min(argc, 1), argv + argc);
+  for (std::string &argument : arguments) {
+    if (argument == "--") break;
+    if (argument == "-decimal") argument = "--decimal";
+  }
+  return arguments;
+}
+
+int runProgram(int argc, char **argv) {
+  CommandContext context;
+  context.arguments.assign(argv + std::min(argc, 1), argv + argc);
+  context.messages.colour = ::isatty(STDERR_FILENO) == 1 && std::getenv("NO_COLOR") == nullptr;
+
+  CLI::App app("Decodes the vendor reports of the Vesk controller", "vesk-report");
+  app.set_version_flag("--version", "vesk-report " VESK_REPORT_VERSION);
+  app.footer(kExitCodes);
+  app.require_subcommand(1);
+  app.fallthrough();
+  app.add_flag("-q,--quiet", context.messages.quiet, "errors only");
+  app.add_flag("-v,--verbose", context.messages.verbose,
+               "notes too, and every message rather than the first of its kind");
+  addDecode(app, context);
+  addConvert(app, context);
+  addReports(app, context);
+
+  try {
+    std::vector<std::string> arguments = takeArguments(argc, argv);
+    std::reverse(arguments.begin(), arguments.end());  // CLI11 takes them from the back
+    app.parse(std::move(arguments));
+  } catch (const CLI::ParseError &error) {
+    return app.exit(error) == 0 ? kExitOk : kExitUsage;
+  }
+  return context.exitCode;
+}
+
+}  // namespace
+
+int main(int argc, char **argv) {
+  std::signal(SIGPIPE, SIG_IGN);
+  try {
+    return runProgram(argc, argv);
+  } catch (const PipeClosed &) {
+    return kExitOk;
+  } catch (const OutputError &error) {
+    std::fprintf(stderr, "vesk-report: error: %s\n", error.what());
+    return kExitOutput;
+  } catch (const std::exception &error) {
+    std::fprintf(stderr, "vesk-report: error: %s\n", error.what());
+    return kExitUnreadable;
+  }
+}
