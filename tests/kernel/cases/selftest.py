@@ -8,6 +8,7 @@ import tempfile
 import unittest
 
 sys.path.insert(0, str(pathlib.Path(__file__).resolve().parent.parent))
+sys.dont_write_bytecode = True  # the source folder stays clean
 import bench
 
 EIO, ENOENT, EACCES, EINVAL, EPIPE = 5, 2, 13, 22, 32
