@@ -1,0 +1,69 @@
+#!/bin/bash
+# What must hold before a change is handed in; prints the time of each step.
+# Usage: tools/check.sh [STEP]...     (without a name: all of them)
+# Needs the packages of tools/packages.*, which tools/install_packages installs.
+set -uo pipefail
+
+cd "$(dirname "$0")/.." || exit 1
+
+tests() { ./test; }
+
+format() { git ls-files '*.h' '*.cpp' | xargs clang-format-14 --dry-run -Werror; }
+
+scripts() {
+  local bash
+  mapfile -t bash < <(git grep -lE '^#!/bin/(ba)?sh')
+  shellcheck "${bash[@]}"
+}
+
+# The second compiler: warnings are errors there too.
+clang() {
+  tools/build clang &&
+    ctest --test-dir build/clang --parallel 2 --output-on-failure --no-tests=error --label-exclude kernel --quiet
+}
+
+# What .clang-tidy lists is an error. Needs the compile commands of the clang build.
+tidy() {
+  local sources
+  tools/build clang &&
+    mapfile -t sources < <(git ls-files 'values/*.cpp' 'plugin/*.cpp' 'reports/*.cpp' 'host/*.cpp') &&
+    printf '%s\n' "${sources[@]}" | xargs -P 2 -n 4 clang-tidy-14 -p build/clang --quiet
+}
+
+# Each step, the minutes that it may take, and the command where it is not a function above.
+steps() {
+  step format 1
+  step scripts 1
+  step tests 45
+  step clang 20
+  step tidy 20
+}
+
+wanted=("$@") done=0 passed=0 failed=0
+step() {
+  local name=$1 minutes=$2 status=0 start=$SECONDS
+  shift 2
+  if [[ ${#wanted[@]} != 0 && " ${wanted[*]} " != *" $name "* ]]; then return; fi
+  echo "== $name"
+  if [[ $# == 0 ]]; then
+    export -f "${name?}"
+    set -- bash -uo pipefail -c "$name"
+  fi
+  timeout --kill-after=10 "${minutes}m" "$@" </dev/null || status=$?
+  if [[ $status == 0 ]]; then passed=$((passed + 1)); else failed=$((failed + 1)); fi
+  case $status in
+    0) echo "== $name: passed in $((SECONDS - start)) s" ;;
+    124 | 137) echo "== $name: FAILED, not done after $minutes minutes" ;;
+    *) echo "== $name: FAILED with exit code $status after $((SECONDS - start)) s" ;;
+  esac
+  done=$((done + 1))
+}
+steps
+
+if [[ $done == 0 ]]; then
+  echo "There is no step ${wanted[*]}." >&2
+  exit 2
+fi
+echo "Steps:"
+echo "$passed passed, $failed failed"
+[[ $failed == 0 ]]
