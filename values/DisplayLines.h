@@ -46,8 +46,9 @@ class DisplayLines {
   /// Closes the line whose text ends at `end`. REQUIRES: one more byte of room there.
   void endLine(char *end) {
     *end = '\n';
-    ends_.push_back(static_cast<std::size_t>(end - text_.get()));
-    used_ = ends_.back() + 1;
+    const auto size = static_cast<std::size_t>(end - text_.get());
+    ends_.push_back(size);
+    used_ = size + 1;
   }
 
   friend bool operator==(const DisplayLines &a, const DisplayLines &b) noexcept {

@@ -167,17 +167,17 @@ char *writeText(char *out, std::string_view text) noexcept {
 template <Conversion C>
 char *writeFloat(char *out, double value) noexcept {
   char *const begin = out;
-  if (std::signbit(value))
-    *out++ = '-';
-  else if (C.blank)
-    *out++ = ' ';
+  if constexpr (C.left) std::memset(begin, ' ', C.width);
+  *out = std::signbit(value) ? '-' : ' ';
+  out += std::signbit(value) || C.blank;
   if (std::isfinite(value))
-    out = writeFixed(out, value, C.precision);
+    out = writeFixed<C.precision>(out, value);
   else
     out = std::copy_n(std::isnan(value) ? "nan" : "inf", 3, out);
-  if constexpr (!C.left) return alignRight(begin, out, C.width);
-  for (; out < begin + C.width; ++out) *out = ' ';
-  return out;
+  if constexpr (C.left)
+    return std::max(out, begin + C.width);
+  else
+    return alignRight(begin, out, C.width);
 }
 
 template <Conversion C, class T>
@@ -186,14 +186,18 @@ char *writeInteger(char *out, T value) noexcept {
                 "a 64-bit number is printed with ll, no other is");
   using Unsigned = std::conditional_t<C.longLong, std::uint64_t, std::uint32_t>;
   const auto bits = static_cast<Unsigned>(value);
-  if constexpr (C.kind == 'x' && C.width == 8)
+  const bool negative = C.kind == 'i' && static_cast<std::make_signed_t<Unsigned>>(bits) < 0;
+  const Unsigned magnitude = negative ? Unsigned{0} - bits : bits;
+  if constexpr (C.kind == 'x' && C.width == 8) {
     return writeHex8(out, bits);
-  else if constexpr (C.kind == 'x' || C.kind == 'X')
+  } else if constexpr (C.kind == 'x' || C.kind == 'X') {
     return writeHex(out, bits, C.width == 0 ? 1 : C.width, C.kind == 'X');
-  else if constexpr (C.kind == 'u')
-    return alignRight(out, writeDecimal(out, bits), C.width);
-  else
-    return alignRight(out, writeDecimal(out, static_cast<std::make_signed_t<Unsigned>>(bits)), C.width);
+  } else if constexpr (C.width >= 12 && !C.longLong) {
+    return writeAlignedDecimal<C.width>(out, negative, magnitude);
+  } else {
+    *out = '-';
+    return alignRight(out, writeDecimal(out + negative, magnitude), C.width);
+  }
 }
 
 template <Conversion C, class T>

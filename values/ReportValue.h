@@ -16,11 +16,15 @@ class ReportValue;
 
 namespace vesk {
 
-/// A dictionary key: a view of a string literal, made by the compiler, so that it costs nothing and always lives.
+/// A dictionary key: a view of a string literal, made by the compiler, so that it costs nothing and always lives. It is
+/// printable ASCII without quotes and backslashes, so that whoever writes it need not look for something to escape.
 class Key {
  public:
   template <std::size_t Size>
-  consteval Key(const char (&literal)[Size]) : text_(literal, Size - 1) {}  // NOLINT: implicit, like a string_view
+  consteval Key(const char (&literal)[Size]) : text_(literal, Size - 1) {  // NOLINT: implicit, like a string_view
+    for (const char c : text_)
+      if (c < ' ' || c > '~' || c == '"' || c == '\\') throw "a key that would have to be escaped";
+  }
 
   constexpr std::string_view text() const noexcept { return text_; }
 
