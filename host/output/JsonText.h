@@ -1,0 +1,52 @@
+// JSON's strings and numbers, as they stand in every document of ours.
+#pragma once
+
+#include <charconv>
+#include <cmath>
+#include <cstdint>
+#include <string>
+#include <string_view>
+
+#include "host/output/OutputBuffer.h"
+#include "values/NumberText.h"
+
+namespace vesk::host {
+
+/// The text with U+FFFD in place of every byte that is not part of well-formed UTF-8.
+std::string asUtf8(std::string_view text);
+
+/// A JSON string, quotes included. Whatever the bytes are, what is written is well-formed UTF-8.
+void appendJsonString(OutputBuffer &out, std::string_view text);
+
+/// Two digits a byte, lower case, without blanks.
+void appendHexDigits(OutputBuffer &out, std::string_view bytes);
+
+/// Nanoseconds as seconds, exactly, with no more decimals than it takes: 3.000412, -0.5, 7.
+void appendSeconds(OutputBuffer &out, std::int64_t nanoseconds);
+
+/// The most that writeJsonNumber may touch.
+inline constexpr std::size_t kJsonNumberRoom = 40;
+
+/// A number at `out`; returns its end. Floats get the fewest digits that read back to the same value of their own type;
+/// NaN and the infinities, for which JSON has no number, become null.
+template <class Number>
+char *writeJsonNumber(char *out, Number value) noexcept {
+  if constexpr (std::is_floating_point_v<Number>) {
+    if (std::isfinite(value)) return std::to_chars(out, out + kJsonNumberRoom, value).ptr;
+    std::memcpy(out, "null", 4);
+    return out + 4;
+  } else if constexpr (sizeof(Number) == 8) {
+    return writeDecimal(out, value);
+  } else if constexpr (std::is_signed_v<Number>) {
+    return writeDecimal(out, std::int32_t{value});
+  } else {
+    return writeDecimal(out, std::uint32_t{value});
+  }
+}
+
+template <class Number>
+void appendJsonNumber(OutputBuffer &out, Number value) {
+  out.advanceTo(writeJsonNumber(out.room(kJsonNumberRoom), value));
+}
+
+}  // namespace vesk::host
