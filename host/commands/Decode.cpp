@@ -23,7 +23,9 @@ void readInput(ByteSource &source, const InputOptions &options, Pipeline &pipeli
   }
   const InputKind &kind = options.kind == "auto" ? detectInputKind(head) : *findInputKind(options.kind);
   pipeline.message({&kInputKind, source.name(), {}, {}, "read as " + std::string(kind.title)});
-  kind.read(source, options.read, pipeline);
+  ReadOptions readOptions = options.read;
+  readOptions.kindForced = options.kind != "auto";
+  kind.read(source, readOptions, pipeline);
 }
 
 void readFile(const std::string &path, const InputOptions &options, Pipeline &pipeline) {

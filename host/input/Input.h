@@ -23,6 +23,7 @@ class ReadSink {
 struct ReadOptions {
   bool split = false;                    // raw binary holds many reports one behind the other
   std::optional<ReportType> forcedType;  // the type of reports whose input does not tell it
+  bool kindForced = false;               // the user named the kind, so nobody is to doubt it
 };
 
 struct InputKind {

@@ -1,0 +1,110 @@
+// Reading of raw binary, and the last word on what no reader takes.
+#include "host/input/RawBinary.h"
+
+#include <algorithm>
+
+#include "host/input/FoundReports.h"
+#include "host/input/PlainText.h"
+#include "host/report/KnownReports.h"
+
+namespace vesk::host {
+
+namespace {
+
+unsigned idAt(std::string_view bytes) {
+  return static_cast<unsigned char>(bytes[0]);
+}
+
+/// How many bytes the report at the start of `bytes` has: what its ID says, or fewer at the end of the input. A text
+/// ends with its zero, and the zeros that pad it are its own, for no report has the ID 0. 0 for no report of ours.
+std::size_t reportLength(std::string_view bytes) {
+  const KnownReport *known = findReport(idAt(bytes));
+  if (known == nullptr) return 0;
+  if (known->length != KnownReport::Length::kText) return std::min<std::size_t>(known->layoutSize, bytes.size());
+  const std::size_t textEnd = bytes.find('\0', 1);
+  if (textEnd == std::string_view::npos) return bytes.size();
+  return std::min(bytes.find_first_not_of('\0', textEnd), bytes.size());
+}
+
+/// How many whole reports `bytes` are, one behind the other; 0 where something is left over.
+std::size_t countReports(std::string_view bytes) {
+  std::size_t count = 0;
+  while (!bytes.empty()) {
+    const std::size_t length = reportLength(bytes);
+    if (length == 0 || length < findReport(idAt(bytes))->layoutSize) return 0;
+    bytes.remove_prefix(length);
+    ++count;
+  }
+  return count;
+}
+
+std::uint64_t skipRest(ByteSource &source) {
+  const std::uint64_t begin = source.offset();
+  for (std::size_t size = 0; (size = source.peek().size()) != 0;) source.skip(size);
+  return source.offset() - begin;
+}
+
+void readSplit(ByteSource &source, FoundReports &found) {
+  for (;;) {
+    const std::string_view bytes = source.peek(kMostReportBytes).substr(0, kMostReportBytes);
+    if (bytes.empty()) return;
+    const Place place = Place::offset(source.offset());
+    const std::size_t length = reportLength(bytes);
+    if (length == 0) {
+      const unsigned id = idAt(bytes);
+      const std::uint64_t rest = skipRest(source);
+      found.say(kRawNoReportId, place,
+                "no report of the controller has this ID, so its length is unknown; " + std::to_string(rest) +
+                    (rest == 1 ? " byte was not read" : " bytes were not read"),
+                id);
+      return;
+    }
+    if (length == kMostReportBytes) {
+      found.say(kRawTooLong, place, "the text does not end within 65536 bytes; the rest was not read", idAt(bytes));
+      skipRest(source);
+      return;
+    }
+    found.addUntyped(bytes.substr(0, length), place);
+    source.skip(length);
+  }
+}
+
+void readOne(ByteSource &source, FoundReports &found) {
+  const std::string_view bytes = source.peek(kMostReportBytes + 1);
+  const Place place = Place::offset(0);
+  if (bytes.empty()) return;
+  if (bytes.size() > kMostReportBytes) {
+    found.say(kRawTooLong, place,
+              "more than 65536 bytes are no single report; --split reads reports that follow one another");
+    skipRest(source);
+    return;
+  }
+  if (const std::size_t count = countReports(bytes); count > 1)
+    found.say(kRawManyReports, place,
+              "read as one report; its bytes would make " + std::to_string(count) +
+                  " reports one behind the other, as --split reads them");
+  found.addUntyped(bytes, place);
+  source.skip(bytes.size());
+}
+
+void read(ByteSource &source, const ReadOptions &options, ReadSink &sink) {
+  FoundReports found(source, options, sink);
+  if (!options.kindForced && isText(source.peek(kHeadSize).substr(0, kHeadSize))) {
+    found.say(kUnknownInput, {},
+              "a text of no known kind; accepted are hex text (as from xxd, hexdump -C, od -An -v -tx1), HID "
+              "recordings, usbhid-dump output and usbmon text; --input-format names one");
+    return;
+  }
+  if (options.split)
+    readSplit(source, found);
+  else
+    readOne(source, found);
+  found.finish("the bytes of a report, its ID first");
+}
+
+}  // namespace
+
+// It stands at the end of the list of kinds and takes what nobody else does.
+constinit const InputKind kRawBinary{"raw", "raw binary", [](std::string_view) { return true; }, read};
+
+}  // namespace vesk::host
