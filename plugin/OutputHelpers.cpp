@@ -14,19 +14,28 @@ constexpr std::uint32_t kValuesPerLine = 8;
 template <class Field, class Write>
 void addLines(DisplayLines &lines, const void *data, std::uint32_t count, std::size_t room, Write write) {
   const auto *field = static_cast<const Field *>(data);
-  do {
-    const std::uint32_t onThisLine = std::min(count, kValuesPerLine);
-    char *out = lines.room(onThisLine * room + 1);
-    for (std::uint32_t i = 0; i < onThisLine; ++i) out = write(out, *field++);
+  for (; count > kValuesPerLine; count -= kValuesPerLine) {  // whole lines, so that the compiler knows how many values
+    char *out = lines.room(kValuesPerLine * room + 1);
+    for (std::uint32_t i = 0; i < kValuesPerLine; ++i) out = write(out, *field++);
     lines.endLine(out);
-    count -= onThisLine;
-  } while (count != 0);
+  }
+  char *out = lines.room(count * room + 1);
+  for (std::uint32_t i = 0; i < count; ++i) out = write(out, *field++);
+  lines.endLine(out);
 }
 
 template <FormatText F, class Field>
 void addLinesAs(DisplayLines &lines, const void *data, std::uint32_t count) {
   addLines<Field>(lines, data, count, Format<F>::room(Field()),
                   [](char *out, const Field &field) { return Format<F>::write(out, field); });
+}
+
+/// "%08x ", the format that a recording is full of: the blank comes with the digits.
+template <class Field>
+void addHexLines(DisplayLines &lines, const void *data, std::uint32_t count) {
+  addLines<Field>(lines, data, count, 9, [](char *out, const Field &field) {
+    return writeHex8(out, static_cast<std::uint32_t>(typename Field::value_type{field})) + 1;
+  });
 }
 
 #pragma GCC diagnostic push

@@ -15,15 +15,20 @@ constexpr auto makeFourDigits() {
 
 constexpr auto makeThreeHexDigits() {
   constexpr char digits[] = "0123456789abcdef";
-  std::array<std::array<char, 4>, 4096> table{};
-  for (unsigned i = 0; i < table.size(); ++i) table[i] = {digits[i >> 8], digits[i >> 4 & 15], digits[i & 15], ' '};
+  std::array<char, 4 * 4096> table{};
+  for (unsigned i = 0; i < 4096; ++i) {
+    table[4 * i] = digits[i >> 8];
+    table[4 * i + 1] = digits[i >> 4 & 15];
+    table[4 * i + 2] = digits[i & 15];
+    table[4 * i + 3] = ' ';
+  }
   return table;
 }
 
 }  // namespace
 
 constexpr std::array<std::array<char, 4>, 10000> kFourDigits = makeFourDigits();
-constexpr std::array<std::array<char, 4>, 4096> kThreeHexDigits = makeThreeHexDigits();
+constexpr std::array<char, 4 * 4096> kThreeHexDigits = makeThreeHexDigits();
 
 char *writeHex(char *out, std::uint64_t value, unsigned minimum, bool upperCase) noexcept {
   const char *digits = upperCase ? "0123456789ABCDEF" : "0123456789abcdef";

@@ -14,8 +14,8 @@ namespace vesk {
 /// The most that any function here may touch behind `out`, digits and scratch together.
 inline constexpr std::size_t kNumberRoom = 24;
 
-extern const std::array<std::array<char, 4>, 10000> kFourDigits;     // "0000" to "9999"
-extern const std::array<std::array<char, 4>, 4096> kThreeHexDigits;  // "000" to "fff", each with a blank behind it
+extern const std::array<std::array<char, 4>, 10000> kFourDigits;  // "0000" to "9999"
+extern const std::array<char, 4 * 4096> kThreeHexDigits;          // "000 001 ... fff "
 
 inline char *writeFourDigits(char *out, std::uint32_t value) noexcept {
   std::memcpy(out, kFourDigits.data()[value].data(), 4);
@@ -91,11 +91,12 @@ char *writeAlignedDecimal(char *out, bool negative, std::uint32_t magnitude) noe
   return out + Width;
 }
 
-/// Exactly eight lower-case digits.
+/// Exactly eight lower-case digits; the byte behind them is a blank then.
 inline char *writeHex8(char *out, std::uint32_t value) noexcept {
-  std::memcpy(out, kThreeHexDigits.data()[value >> 20].data(), 4);
-  std::memcpy(out + 3, kThreeHexDigits.data()[value >> 8 & 0xFFF].data(), 4);
-  std::memcpy(out + 6, kThreeHexDigits.data()[value << 4 & 0xFF0].data(), 2);
+  const char *table = kThreeHexDigits.data();
+  std::memcpy(out, table + 1 + 4 * (value >> 24), 4);  // of "0ff " the last two; what follows is written over
+  std::memcpy(out + 2, table + 4 * (value >> 12 & 0xFFF), 4);
+  std::memcpy(out + 5, table + 4 * (value & 0xFFF), 4);
   return out + 8;
 }
 
