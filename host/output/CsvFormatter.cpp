@@ -53,11 +53,11 @@ void appendElement(OutputBuffer &out, const ReportValue &array, std::size_t inde
   std::visit(
       [&]<class T>(const T &numbers) {
         if constexpr (std::is_same_v<T, std::vector<float>>) {
-          char *const begin = out.room(kJsonNumberRoom);
-          out.advanceTo(std::to_chars(begin, begin + kJsonNumberRoom, numbers[index]).ptr);
+          char *const begin = out.room(kTextNumberRoom);
+          out.advanceTo(std::to_chars(begin, begin + kTextNumberRoom, numbers[index]).ptr);
         } else if constexpr (std::is_same_v<T, std::vector<std::uint32_t>> ||
                              std::is_same_v<T, std::vector<std::int32_t>>) {
-          appendJsonNumber(out, numbers[index]);
+          appendNumber(out, numbers[index]);
         }
       },
       array.variant());
@@ -67,7 +67,7 @@ void appendElement(OutputBuffer &out, const ReportValue &array, std::size_t inde
 void appendPrefix(OutputBuffer &out, const SourceReport &report, const Samples &samples, const ReportValue &value) {
   appendField(out, report.file);
   out.append(',');
-  appendJsonNumber(out, report.index);
+  appendNumber(out, report.index);
   out.append(',');
   if (report.timeNs) appendSeconds(out, *report.timeNs);
   out.append(',');
@@ -75,7 +75,7 @@ void appendPrefix(OutputBuffer &out, const SourceReport &report, const Samples &
   out.append(',');
   out.append(findReport(report.id)->name);
   out.append(',');
-  if (!samples.number.empty()) appendJsonNumber(out, value.at(samples.number).as<std::uint32_t>());
+  if (!samples.number.empty()) appendNumber(out, value.at(samples.number).as<std::uint32_t>());
   out.append(',');
 }
 
@@ -115,7 +115,7 @@ class CsvFormatter : public Formatter {
     const std::size_t channels = columns[samples.firstColumn]->size();
     for (std::size_t channel = 0; channel < channels; ++channel) {
       out.append(prefix);
-      appendJsonNumber(out, std::uint64_t{channel});
+      appendNumber(out, std::uint64_t{channel});
       for (const ReportValue *column : columns) {
         out.append(',');
         if (column != nullptr) appendElement(out, *column, channel);

@@ -20,7 +20,9 @@ void appendComment(OutputBuffer &out, const SourceReport &report) {
     out.append(' ');
     out.append(known->name);
   }
-  out.append(", " + std::to_string(report.bytes.size()) + (report.bytes.size() == 1 ? " byte" : " bytes"));
+  out.append(", ");
+  appendNumber(out, std::uint64_t{report.bytes.size()});
+  out.append(report.bytes.size() == 1 ? " byte" : " bytes");
   if (report.timeNs) {
     out.append(", ");
     appendSeconds(out, *report.timeNs);

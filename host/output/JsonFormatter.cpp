@@ -22,7 +22,7 @@ void appendSource(OutputBuffer &out, const SourceReport &report) {
   out.append(R"({"source":{"file":)");
   appendJsonString(out, report.file);
   out.append(R"(,"index":)");
-  appendJsonNumber(out, report.index);
+  appendNumber(out, report.index);
   out.append(R"(,"time":)");
   if (report.timeNs)
     appendSeconds(out, *report.timeNs);
@@ -34,7 +34,7 @@ void appendSource(OutputBuffer &out, const SourceReport &report) {
 
 void appendReport(OutputBuffer &out, const SourceReport &report) {
   out.append(R"(},"report":{"id":)");
-  appendJsonNumber(out, report.id);
+  appendNumber(out, report.id);
   out.append(R"(,"hex":")");
   out.advanceTo(writeHex(out.room(kNumberRoom), report.id, 2, true));
   out.append(R"(","type":")");
@@ -43,7 +43,7 @@ void appendReport(OutputBuffer &out, const SourceReport &report) {
   const KnownReport *known = findReport(report.id);
   appendStringOrNull(out, known == nullptr ? "" : known->name);
   out.append(R"(,"length":)");
-  appendJsonNumber(out, std::uint64_t{report.bytes.size()});
+  appendNumber(out, std::uint64_t{report.bytes.size()});
 }
 
 void appendValue(OutputBuffer &out, const std::optional<ReportValue> &value) {
@@ -97,7 +97,7 @@ void appendPlace(OutputBuffer &out, const Place &place) {
   out.append(R"({"kind":")");
   out.append(kKinds[static_cast<std::size_t>(place.kind)]);
   out.append(R"(","number":)");
-  appendJsonNumber(out, place.number);
+  appendNumber(out, place.number);
   out.append('}');
 }
 
@@ -110,13 +110,13 @@ void appendMessage(OutputBuffer &out, const Messages::Kept &kept) {
   appendPlace(out, message.place);
   out.append(R"(,"report_id":)");
   if (message.reportId)
-    appendJsonNumber(out, *message.reportId);
+    appendNumber(out, *message.reportId);
   else
     out.append("null");
   out.append(R"(,"text":)");
   appendJsonString(out, message.text);
   out.append(R"(,"count":)");
-  appendJsonNumber(out, kept.count);
+  appendNumber(out, kept.count);
   out.append('}');
 }
 
@@ -127,7 +127,7 @@ void appendMessages(OutputBuffer &out, const Messages &messages) {
     appendMessage(out, kept);
   }
   out.append(R"(],"exit_status":)");
-  appendJsonNumber(out, std::int32_t{messages.exitCode()});
+  appendNumber(out, std::int32_t{messages.exitCode()});
   out.append("}\n");
 }
 
@@ -166,7 +166,7 @@ class JsonFormatter : public Formatter {
     } else {
       envelope(out);
       out.append(R"(,"summary":{"reports":)");
-      appendJsonNumber(out, summary.reports);
+      appendNumber(out, summary.reports);
       out.append('}');
     }
     appendMessages(out, *summary.messages);

@@ -24,15 +24,15 @@ void appendHexDigits(OutputBuffer &out, std::string_view bytes);
 /// Nanoseconds as seconds, exactly, with no more decimals than it takes: 3.000412, -0.5, 7.
 void appendSeconds(OutputBuffer &out, std::int64_t nanoseconds);
 
-/// The most that writeJsonNumber may touch.
-inline constexpr std::size_t kJsonNumberRoom = 40;
+/// The most that writeNumber may touch.
+inline constexpr std::size_t kTextNumberRoom = 40;
 
 /// A number at `out`; returns its end. Floats get the fewest digits that read back to the same value of their own type;
 /// NaN and the infinities, for which JSON has no number, become null.
 template <class Number>
-char *writeJsonNumber(char *out, Number value) noexcept {
+char *writeNumber(char *out, Number value) noexcept {
   if constexpr (std::is_floating_point_v<Number>) {
-    if (std::isfinite(value)) return std::to_chars(out, out + kJsonNumberRoom, value).ptr;
+    if (std::isfinite(value)) return std::to_chars(out, out + kTextNumberRoom, value).ptr;
     std::memcpy(out, "null", 4);
     return out + 4;
   } else if constexpr (sizeof(Number) == 8) {
@@ -45,8 +45,8 @@ char *writeJsonNumber(char *out, Number value) noexcept {
 }
 
 template <class Number>
-void appendJsonNumber(OutputBuffer &out, Number value) {
-  out.advanceTo(writeJsonNumber(out.room(kJsonNumberRoom), value));
+void appendNumber(OutputBuffer &out, Number value) {
+  out.advanceTo(writeNumber(out.room(kTextNumberRoom), value));
 }
 
 }  // namespace vesk::host

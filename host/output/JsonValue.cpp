@@ -29,10 +29,10 @@ bool isLossy(Number value) {
 template <class Number>
 bool appendArray(OutputBuffer &out, const std::vector<Number> &numbers) {
   bool lossy = false;
-  char *end = out.room(2 + numbers.size() * (kJsonNumberRoom + 1));
+  char *end = out.room(2 + numbers.size() * (kTextNumberRoom + 1));
   *end++ = '[';
   for (const Number number : numbers) {
-    end = writeJsonNumber(end, number);
+    end = writeNumber(end, number);
     *end++ = ',';
     lossy |= isLossy(number);
   }
@@ -107,7 +107,7 @@ class ExactWriter {
     if constexpr (std::is_floating_point_v<Number>)
       out_.append(std::isnan(value) ? "nan" : value < 0 ? "-inf" : "inf");
     else
-      appendJsonNumber(out_, value);
+      appendNumber(out_, value);
     out_.append('"');
   }
 
@@ -131,7 +131,7 @@ bool appendJsonValue(OutputBuffer &out, const ReportValue &value) {
           out.append(alternative ? "true" : "false");
           return false;
         } else {
-          appendJsonNumber(out, alternative);
+          appendNumber(out, alternative);
           return isLossy(alternative);
         }
       },

@@ -36,7 +36,8 @@ std::string reportDescriptor() {
 
 /// " 3 e0 0d 05": the count, then each byte behind a blank.
 void appendCountAndBytes(OutputBuffer &out, std::string_view bytes) {
-  out.append(" " + std::to_string(bytes.size()));
+  out.append(' ');
+  appendNumber(out, std::uint64_t{bytes.size()});
   char *end = out.room(3 * bytes.size());
   for (const char byte : bytes) {
     *end++ = ' ';
@@ -44,6 +45,13 @@ void appendCountAndBytes(OutputBuffer &out, std::string_view bytes) {
   }
   out.advanceTo(end);
   out.append('\n');
+}
+
+/// At least six digits.
+void appendSixDigits(OutputBuffer &out, std::int64_t number) {
+  std::string digits = std::to_string(number);
+  if (digits.size() < 6) digits.insert(0, 6 - digits.size(), '0');
+  out.append(digits);
 }
 
 class RecordingFormatter : public Formatter {
@@ -74,16 +82,19 @@ class RecordingFormatter : public Formatter {
   void turnTo(OutputBuffer &out, const SourceReport &report) {
     const auto [device, isNew] =
         devices_.try_emplace({std::string(report.device), report.vendorProduct}, devices_.size());
-    if (device->second != current_) out.append("D: " + std::to_string(device->second) + "\n");
+    if (device->second != current_) {
+      out.append("D: ");
+      appendNumber(out, std::uint64_t{device->second});
+      out.append('\n');
+    }
     current_ = device->second;
     if (isNew) appendHeader(out, report);
   }
 
   static void appendHeader(OutputBuffer &out, const SourceReport &report) {
-    constexpr const char *kName = "N: Vesk controller";
     out.append("R:");
     appendCountAndBytes(out, reportDescriptor());
-    out.append(kName);
+    out.append("N: Vesk controller");
     if (!report.device.empty()) {
       out.append(", device ");
       out.append(report.device);
@@ -102,10 +113,10 @@ class RecordingFormatter : public Formatter {
       const std::int64_t nanoseconds = std::max<std::int64_t>(*report.timeNs, 0);
       lastMicroseconds_ = nanoseconds / 1000 + (nanoseconds % 1000 >= 500 ? 1 : 0);
     }
-    std::string time = std::to_string(lastMicroseconds_ / 1'000'000);
-    if (time.size() < 6) time.insert(0, 6 - time.size(), '0');
-    const std::string fraction = std::to_string(lastMicroseconds_ % 1'000'000);
-    out.append(" " + time + "." + std::string(6 - fraction.size(), '0') + fraction);
+    out.append(' ');
+    appendSixDigits(out, lastMicroseconds_ / 1'000'000);
+    out.append('.');
+    appendSixDigits(out, lastMicroseconds_ % 1'000'000);
   }
 
   std::map<std::pair<std::string, std::optional<std::uint32_t>>, std::size_t> devices_;  // to their indexes
