@@ -1,0 +1,34 @@
+// The error value's words.
+#include "values/PluginError.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+namespace {
+
+using testing::HasSubstr;
+using testing::Not;
+
+TEST(PluginError, DescriptionHoldsDomainCodeAndMessageOnOneLine) {
+  const PluginError error{"Domain", -536870206, {{PluginError::kLocalizedDescription, "Invalid option: -x"}}};
+  EXPECT_EQ(error.localizedDescription(), "Invalid option: -x");
+  EXPECT_THAT(error.description(), HasSubstr("Domain"));
+  EXPECT_THAT(error.description(), HasSubstr("-536870206"));
+  EXPECT_THAT(error.description(), HasSubstr("Invalid option: -x"));
+  EXPECT_THAT(error.description(), Not(HasSubstr("\n")));
+}
+
+TEST(PluginError, ControlCharactersOfTheMessageStayOffTheTerminal) {
+  const PluginError error{"D", 1, {{PluginError::kLocalizedDescription, "a\nb\x1B[2J\r\x7F\xC3\xA4"}}};
+  EXPECT_EQ(error.localizedDescription(), "a\nb\x1B[2J\r\x7F\xC3\xA4");
+  for (const char control : {'\n', '\r', '\x1B', '\x7F'})
+    EXPECT_EQ(error.description().find(control), std::string::npos) << int{control};
+  EXPECT_THAT(error.description(), HasSubstr("\xC3\xA4"));
+}
+
+TEST(PluginError, WithoutAMessage) {
+  EXPECT_EQ(PluginError().localizedDescription(), "");
+  EXPECT_THAT((PluginError{"D", 7, {}}).description(), HasSubstr("7"));
+}
+
+}  // namespace
