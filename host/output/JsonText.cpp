@@ -42,6 +42,23 @@ std::size_t characterSize(std::string_view text) {
   return 0;
 }
 
+/// Most texts are short and plain.
+bool isPlain(std::string_view text) {
+  return std::all_of(text.begin(), text.end(), [](char c) { return c >= 0 && escapeOf(c) == 0; });
+}
+
+void appendEscaped(OutputBuffer &out, std::string_view text) {
+  out.append('"');
+  for (std::size_t begin = 0; begin < text.size();) {
+    std::size_t end = begin;
+    while (end < text.size() && escapeOf(text[end]) == 0) ++end;
+    out.append(text.substr(begin, end - begin));
+    if (end < text.size()) appendEscape(out, text[end++]);
+    begin = end;
+  }
+  out.append('"');
+}
+
 }  // namespace
 
 std::string asUtf8(std::string_view text) {
@@ -55,16 +72,17 @@ std::string asUtf8(std::string_view text) {
 }
 
 void appendJsonString(OutputBuffer &out, std::string_view text) {
-  if (!isUtf8(text)) return appendJsonString(out, asUtf8(text));
-  out.append('"');
-  for (std::size_t begin = 0; begin < text.size();) {
-    std::size_t end = begin;
-    while (end < text.size() && escapeOf(text[end]) == 0) ++end;
-    out.append(text.substr(begin, end - begin));
-    if (end < text.size()) appendEscape(out, text[end++]);
-    begin = end;
+  if (isPlain(text)) {
+    char *end = out.room(text.size() + 2);
+    *end++ = '"';
+    end = std::copy(text.begin(), text.end(), end);
+    *end++ = '"';
+    out.advanceTo(end);
+  } else if (isUtf8(text)) {
+    appendEscaped(out, text);
+  } else {
+    appendEscaped(out, asUtf8(text));
   }
-  out.append('"');
 }
 
 void appendHexDigits(OutputBuffer &out, std::string_view bytes) {

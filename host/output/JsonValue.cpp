@@ -50,8 +50,7 @@ bool appendDictionary(OutputBuffer &out, const Dictionary &dictionary) {
     char *end = out.room(name.size() + 4);
     *end++ = separator;
     *end++ = '"';
-    std::memcpy(end, name.data(), name.size());
-    end += name.size();
+    end = std::copy(name.begin(), name.end(), end);
     *end++ = '"';
     *end++ = ':';
     out.advanceTo(end);
