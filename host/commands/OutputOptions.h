@@ -15,13 +15,15 @@ struct OutputOptions {
   std::string file = "-";
   bool decimal = false;
   bool lenient = false;
+  unsigned jobs = 0;  // 0: as many as the machine has use for
   FormatOptions format;
 
   /// Adds -o, -O, -decimal and the others to a command, as one group.
   void addTo(CLI::App &command);
 
   std::unique_ptr<Formatter> makeFormatter() const;
-  Pipeline::Options pipeline() const { return {decimal, lenient, false}; }
+  /// For recordings; live input flushes each report instead of sharing the work.
+  Pipeline::Options pipeline() const;
 };
 
 }  // namespace vesk::host

@@ -1,17 +1,13 @@
-// The steps that each report goes through.
+// The steps that each report goes through, on one thread or on several.
 #include "host/decode/Pipeline.h"
 
-#include "values/PrintfFormat.h"
+#include <utility>
 
 namespace vesk::host {
 
 namespace {
 
 constexpr std::size_t kWriteAt = std::size_t{256} << 10;  // how much output is gathered for one write
-
-Message about(const SourceReport &report, const Finding &finding) {
-  return {finding.kind, std::string(report.file), report.place, report.id, finding.text};
-}
 
 }  // namespace
 
@@ -22,7 +18,13 @@ Pipeline::Pipeline(const Options &options, const Filter &filter, Formatter &form
       formatter_(formatter),
       output_(output),
       messages_(messages),
-      decoder_({formatter.wantsLines(), formatter.wantsValue(), options.decimal, options.lenient}) {}
+      printer_(formatter, options.decimal, options.lenient) {
+  if (options.jobs < 2 || options.flushEachReport || !formatter.isStateless()) return;
+  workers_ = std::make_unique<Workers>(
+      options.jobs, [this] { return std::make_unique<ReportPrinter>(formatter_, options_.decimal, options_.lenient); },
+      [this](Batch &batch) { deliver(batch); });
+  batch_ = workers_->take();
+}
 
 void Pipeline::begin() {
   formatter_.begin(buffer_);
@@ -31,12 +33,14 @@ void Pipeline::begin() {
 void Pipeline::report(const SourceReport &report) {
   countLoss(report);
   if (!filter_.wants(report)) return;
-  const Decoded &decoded = decoder_.decode(report);
-  formFindings_.clear();
-  formatter_.report(buffer_, report, decoded, reports_ == 0, formFindings_);
-  ++reports_;
-  for (const Finding &finding : decoded.findings) messages_.add(about(report, finding));
-  for (const Finding &finding : formFindings_) messages_.add(about(report, finding));
+  const bool first = reports_++ == 0;
+  if (workers_) {
+    addToBatch(report, first);
+    return;
+  }
+  printer_.print(report, first, buffer_, reportMessages_);
+  for (Message &message : reportMessages_) messages_.add(std::move(message));
+  reportMessages_.clear();
   if (buffer_.size() >= kWriteAt || options_.flushEachReport) flush();
 }
 
@@ -49,11 +53,13 @@ void Pipeline::countLoss(const SourceReport &report) {
 }
 
 void Pipeline::message(Message message) {
-  messages_.add(std::move(message));
+  if (workers_)
+    addToBatch(Batch::Event(std::move(message)));
+  else
+    messages_.add(std::move(message));
 }
 
 void Pipeline::finishFile(std::string_view file) {
-  messages_.finishFile(file);
   const LossCounter::Total total = std::exchange(losses_, {}).total();
   if (total.gaps > 1)
     message({&kLossTotal,
@@ -61,9 +67,36 @@ void Pipeline::finishFile(std::string_view file) {
              {},
              {},
              std::to_string(total.lost) + " reports lost in " + std::to_string(total.gaps) + " gaps"});
+  if (workers_)
+    addToBatch(Batch::Event(Batch::FileEnd{std::string(file)}));
+  else
+    messages_.finishFile(file);
+}
+
+template <class... Step>
+void Pipeline::addToBatch(Step &&...step) {
+  batch_->add(std::forward<Step>(step)...);
+  if (!batch_->isFull()) return;
+  workers_->put(std::move(batch_));
+  batch_ = workers_->take();
+}
+
+void Pipeline::deliver(Batch &batch) {
+  for (Batch::Event &event : batch.events()) {
+    if (auto *message = std::get_if<Message>(&event))
+      messages_.add(std::move(*message));
+    else
+      messages_.finishFile(std::get<Batch::FileEnd>(event).file);
+  }
+  if (buffer_.size() != 0) flush();  // what begin() has left there
+  output_.write(batch.output().text());
 }
 
 void Pipeline::finish() {
+  if (workers_) {
+    if (!batch_->isEmpty()) workers_->put(std::move(batch_));
+    workers_->drain();
+  }
   const Summary summary{reports_, &messages_};
   formatter_.end(buffer_, summary);
   flush();

@@ -1,7 +1,10 @@
 // From what a reader finds to what is written: filter, decode, format, and tell.
 #pragma once
 
-#include "host/decode/Decoder.h"
+#include <memory>
+
+#include "host/decode/ReportPrinter.h"
+#include "host/decode/Workers.h"
 #include "host/diagnostics/Messages.h"
 #include "host/input/Input.h"
 #include "host/output/Formatter.h"
@@ -11,17 +14,20 @@
 
 namespace vesk::host {
 
+/// Whatever the number of threads, what is written and told is the same, in the same order. Everything here throws
+/// OutputError and PipeClosed.
 class Pipeline : public ReadSink {
  public:
   struct Options {
     bool decimal = false;
     bool lenient = false;
-    bool flushEachReport = false;  // for live output
+    bool flushEachReport = false;  // for live output; one thread then
+    unsigned jobs = 1;             // threads that decode
   };
 
   Pipeline(const Options &options, const Filter &filter, Formatter &formatter, OutputFile &output, Messages &messages);
 
-  /// Before the first report. Everything here throws OutputError and PipeClosed.
+  /// Before the first report.
   void begin();
   void report(const SourceReport &report) override;
   void message(Message message) override;
@@ -30,11 +36,14 @@ class Pipeline : public ReadSink {
   /// When all are done: the end of the document, and the output file's name.
   void finish();
 
-  /// Reports that reached the output.
+  /// Reports that went to the output.
   std::uint64_t reports() const { return reports_; }
 
  private:
   void countLoss(const SourceReport &report);
+  template <class... Step>
+  void addToBatch(Step &&...step);
+  void deliver(Batch &batch);
   void flush();
 
   Options options_;
@@ -42,11 +51,15 @@ class Pipeline : public ReadSink {
   Formatter &formatter_;
   OutputFile &output_;
   Messages &messages_;
-  Decoder decoder_;
   OutputBuffer buffer_;
-  std::vector<Finding> formFindings_;
   LossCounter losses_;
   std::uint64_t reports_ = 0;
+  // With one thread:
+  ReportPrinter printer_;
+  std::vector<Message> reportMessages_;
+  // With several: the batch that is being filled, and the threads.
+  std::unique_ptr<Batch> batch_;
+  std::unique_ptr<Workers> workers_;
 };
 
 }  // namespace vesk::host
