@@ -1,0 +1,55 @@
+// A stream of our own under libpcap's offline reader.
+#include "host/input/CaptureHandle.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+
+namespace vesk::host {
+
+ssize_t CaptureHandle::give(void *self, char *out, std::size_t size) {
+  auto &handle = *static_cast<CaptureHandle *>(self);
+  if (handle.first_.empty()) std::swap(handle.first_, handle.second_);
+  const std::size_t count = std::min(size, handle.first_.size());
+  if (count != 0) std::memcpy(out, handle.first_.data(), count);
+  handle.first_.remove_prefix(count);
+  return static_cast<ssize_t>(count);
+}
+
+CaptureHandle::CaptureHandle(std::string_view head) : first_(head) {
+  stream_ = fopencookie(this, "rb", {&CaptureHandle::give, nullptr, nullptr, nullptr});
+  if (stream_ == nullptr) {
+    error_ = std::strerror(errno);
+    return;
+  }
+  // libpcap asks for a record's header and then for its body; a buffer would only be one more copy.
+  std::setvbuf(stream_, nullptr, _IONBF, 0);
+  char reason[PCAP_ERRBUF_SIZE] = {};
+  handle_.reset(pcap_fopen_offline_with_tstamp_precision(stream_, PCAP_TSTAMP_PRECISION_NANO, reason));
+  first_ = {};
+  if (handle_ != nullptr) return;
+  error_ = reason;
+  std::fclose(stream_);
+}
+
+bool CaptureHandle::read(std::string_view first, std::string_view second, CapturedPacket &packet) {
+  constexpr std::uint64_t kSecond = 1'000'000'000;
+  first_ = first;
+  second_ = second;
+  std::clearerr(stream_);
+  pcap_pkthdr *header = nullptr;
+  const unsigned char *bytes = nullptr;
+  error_.clear();
+  if (pcap_next_ex(handle_.get(), &header, &bytes) != 1) {
+    error_ = pcap_geterr(handle_.get());
+    if (error_.empty()) error_ = "the record holds no packet";
+    return false;
+  }
+  // Unsigned, because a damaged time may lie anywhere.
+  packet.timeNs = static_cast<std::int64_t>(static_cast<std::uint64_t>(header->ts.tv_sec) * kSecond +
+                                            static_cast<std::uint64_t>(header->ts.tv_usec));
+  packet.bytes = {reinterpret_cast<const char *>(bytes), header->caplen};
+  return true;
+}
+
+}  // namespace vesk::host
