@@ -12,9 +12,11 @@ constexpr MessageKind kNoBorder{"raw-border", Severity::kWarning, kExitOk};
 
 bool hasBorder(const SourceReport &report) {
   const KnownReport *known = findReport(report.id);
-  if (known == nullptr || report.bytes.empty() || static_cast<unsigned char>(report.bytes[0]) != report.id)
-    return false;
-  return known->length != KnownReport::Length::kText && report.bytes.size() == known->layoutSize;
+  const std::string_view bytes = report.bytes;
+  if (known == nullptr || bytes.empty() || static_cast<unsigned char>(bytes[0]) != report.id) return false;
+  if (known->length != KnownReport::Length::kText) return bytes.size() == known->layoutSize;
+  const std::size_t textEnd = bytes.find('\0', 1);  // a text ends with its zero and those that pad it
+  return textEnd != std::string_view::npos && bytes.find_first_not_of('\0', textEnd) == std::string_view::npos;
 }
 
 class RawFormatter : public Formatter {
@@ -24,8 +26,7 @@ class RawFormatter : public Formatter {
     out.append(report.bytes);
     if (!hasBorder(report))
       findings.push_back({&kNoBorder, kNoBorder.severity,
-                          "its ID does not tell its length, so where more reports follow, --split will not find its "
-                          "end; -o recording keeps it"});
+                          "where another report follows it, --split will not find its end; -o recording keeps it"});
   }
 };
 

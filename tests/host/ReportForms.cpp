@@ -41,7 +41,9 @@ TEST(Raw, isTheBytes) {
 
 TEST(Raw, saysWhereABorderIsLost) {
   EXPECT_THAT(format("raw", {given(fromHex("DE 01 02"))}).codes, ElementsAre("raw-border"));
-  EXPECT_THAT(format("raw", {given(fromHex("D0 31 00"))}).codes, ElementsAre("raw-border"));
+  EXPECT_THAT(format("raw", {given(fromHex("D0 31 2E"))}).codes, ElementsAre("raw-border"));
+  EXPECT_THAT(format("raw", {given(fromHex("D0 31 00 00 32"))}).codes, ElementsAre("raw-border"));
+  EXPECT_THAT(format("raw", {given(fromHex("D0 31 00 00"))}).codes, IsEmpty());
   EXPECT_THAT(format("raw", {given(fromHex("99 31"))}).codes, ElementsAre("raw-border"));
 }
 
