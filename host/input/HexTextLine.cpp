@@ -1,0 +1,235 @@
+// Taking a line of hex text apart.
+#include "host/input/HexTextLine.h"
+
+#include <algorithm>
+#include <optional>
+
+#include "host/input/FoundReports.h"
+#include "host/input/PlainText.h"
+#include "host/report/KnownReports.h"
+#include "values/PrintfFormat.h"
+
+namespace vesk::host {
+
+namespace {
+
+constexpr std::size_t kHalf = 8;  // after so many bytes hexdump -C prints a second blank
+
+constexpr bool isSeparator(char character) {
+  return std::string_view(",;:[]{}()\"'=").find(character) != std::string_view::npos;
+}
+
+constexpr bool endsWord(char character) {
+  return isBlank(character) || isSeparator(character) ||
+         std::string_view("#|>\\").find(character) != std::string_view::npos;
+}
+
+bool isHex(std::string_view word) {
+  return !word.empty() && std::all_of(word.begin(), word.end(), [](char c) { return hexDigit(c) >= 0; });
+}
+
+/// The word in quotes, short, and printable.
+std::string quoted(std::string_view word) {
+  constexpr std::size_t kMost = 24;
+  std::string text = "\"";
+  for (const char character : word.substr(0, kMost)) {
+    const auto code = static_cast<unsigned char>(character);
+    text += code < 0x20 || code >= 0x7f ? vesk::formatted<"\\x%02x">(unsigned{code}) : std::string(1, character);
+  }
+  return text + (word.size() > kMost ? "...\"" : "\"");
+}
+
+}  // namespace
+
+void HexTextLine::reset() {
+  fields_.clear();
+  hasLabel_ = opensArray_ = colonOffset_ = parted_ = sawComment_ = false;
+  isRun_ = true;
+  words_ = likeHex_ = firstWordAt_ = textAt_ = 0;
+  text_ = {};
+}
+
+void HexTextLine::parse(std::string_view line) {
+  reset();
+  if (!inComment_ && line.find_first_not_of(" \t*") == std::string_view::npos &&
+      std::count(line.begin(), line.end(), '*') == 1) {
+    kind_ = Kind::kRepeat;
+    return;
+  }
+  scan(line, 0);
+  if (words_ != 0)
+    judgeWords(line);
+  else if (fields_.size() > kMostReportBytes)
+    fail("the line has more than 65536 bytes");
+  else if (fields_.size() == 1 && colonOffset_ && fields_[0].digits.size() <= 2)
+    kind_ = Kind::kLabel;  // "E0:" announces what follows
+  else if (!fields_.empty())
+    kind_ = Kind::kData;
+  else if (sawComment_)
+    kind_ = Kind::kComment;
+  else
+    kind_ = line.find_first_not_of(" \t\v\f") == std::string_view::npos ? Kind::kBlank : Kind::kLabel;
+}
+
+/// Reads the fields from `from` to the end, a comment or the text column.
+void HexTextLine::scan(std::string_view line, std::size_t from) {
+  std::size_t at = from;
+  bool afterSeparator = true;
+  while (at < line.size() && fields_.size() <= kMostReportBytes) {
+    if (inComment_) {
+      const std::size_t end = line.find("*/", at);
+      sawComment_ = true;
+      if (end == std::string_view::npos) return;
+      inComment_ = false;
+      at = end + 2;
+      continue;
+    }
+    const char character = line[at];
+    if (character == '#' || line.substr(at, 2) == "//") {
+      sawComment_ = true;
+      return;
+    }
+    if (line.substr(at, 2) == "/*") {
+      inComment_ = true;
+      at += 2;
+      continue;
+    }
+    if (isBlank(character)) {
+      std::size_t end = at;
+      while (end < line.size() && isBlank(line[end])) ++end;
+      if (end == line.size()) return;
+      if (endsField(line, at, end)) {
+        text_ = line.substr(end);
+        textAt_ = end + 1;
+        return;
+      }
+      parted_ = !fields_.empty();
+      at = end;
+      continue;
+    }
+    if ((character == '|' || character == '>') && !fields_.empty()) return;
+    if (character == '>' && words_ == 0) {  // a quotation in a letter
+      ++at;
+      continue;
+    }
+    if (isSeparator(character)) {
+      if ((character == '[' || character == '{') && fields_.empty()) opensArray_ = true;
+      const bool colonEnds = at + 1 == line.size() || isBlank(line[at + 1]);
+      if (character == ':' && colonEnds && fields_.size() == 1 && words_ == 0 && !afterSeparator) {
+        colonOffset_ = true;
+      } else if (character == ',' || character == ';') {
+        parted_ = !fields_.empty();
+      }
+      afterSeparator = true;
+      ++at;
+      continue;
+    }
+    if (line.substr(at, 2) == "\\x") {
+      at += 2;
+      afterSeparator = true;
+    }
+    std::size_t end = at;
+    while (end < line.size() && !endsWord(line[end])) ++end;
+    if (end == at) ++end;  // a character that is nothing here
+    takeField(line, at, end);
+    afterSeparator = false;
+    at = end;
+  }
+}
+
+/// Whether blanks from `from` to `to` end the hex field of a dump, so that its text column follows. Between fields
+/// there is one blank, or two in the middle of a line from hexdump -C.
+bool HexTextLine::endsField(std::string_view line, std::size_t from, std::size_t to) const {
+  const std::size_t blanks = to - from +
+                             static_cast<std::size_t>(std::count(line.begin() + static_cast<std::ptrdiff_t>(from),
+                                                                 line.begin() + static_cast<std::ptrdiff_t>(to), '\t'));
+  if (fields_.size() < 2 || blanks < 2 || words_ != 0) return false;
+  if (colonOffset_) return true;
+  if (!mayHaveOffset()) return false;
+  return blanks > 2 || fields_.size() != 1 + kHalf;
+}
+
+void HexTextLine::takeField(std::string_view line, std::size_t begin, std::size_t end) {
+  std::string_view word = line.substr(begin, end - begin);
+  const bool prefixed = word.starts_with("0x") || word.starts_with("0X");
+  const std::string_view digits = word.substr(prefixed ? 2 : 0);
+  // b'...' is how Python writes bytes, where most of them are no digits.
+  const bool python = fields_.empty() && word == "b" && end < line.size() && (line[end] == '\'' || line[end] == '"');
+  if (isHex(digits) && !python) {
+    fields_.push_back({digits, begin + 1, prefixed});
+    isRun_ = isRun_ && !parted_;
+    if (digits.size() == 1 || digits.size() % 2 == 0) ++likeHex_;
+    return;
+  }
+  if (words_++ == 0) {
+    firstWord_ = word;
+    firstWordAt_ = begin + 1;
+  }
+}
+
+/// A line with words: a label where most of it is words, with or without data behind it; else a slip.
+void HexTextLine::judgeWords(std::string_view line) {
+  const std::size_t all = words_ + fields_.size(), likeHex = likeHex_;
+  const std::string problem =
+      quoted(firstWord_) + " in column " + std::to_string(firstWordAt_) + " is no hexadecimal byte";
+  if (dataBehindLabel(line)) {
+    kind_ = Kind::kData;
+    hasLabel_ = true;
+    isRun_ = false;
+  } else if (2 * likeHex < all) {
+    kind_ = Kind::kLabel;
+  } else {
+    fail(problem);
+  }
+}
+
+bool HexTextLine::dataBehindLabel(std::string_view line) {
+  const auto behind = [line](std::string_view mark) -> std::optional<std::size_t> {
+    const std::size_t at = line.rfind(mark);
+    if (at == std::string_view::npos) return {};
+    return at + mark.size();
+  };
+  const std::size_t brace = line.find('{');
+  const bool hasBrace = brace != std::string_view::npos;
+  for (const auto &from : {hasBrace ? std::optional(brace) : std::nullopt, behind("= "), behind(": "), behind("\":")}) {
+    if (!from) continue;
+    reset();
+    inComment_ = false;
+    scan(line, *from);
+    if (words_ != 0 || fields_.empty()) continue;
+    if (hasBrace && *from == brace) return true;
+    // A number behind a word need not be a report: "length: 64".
+    const Field &first = fields_[0];
+    const auto id = parseNumber(first.digits.substr(0, 2), 16);
+    if (!colonOffset_ && id && findReport(static_cast<std::uint32_t>(*id)) != nullptr &&
+        (fields_.size() > 1 || first.digits.size() >= 14))
+      return true;
+  }
+  return false;
+}
+
+void HexTextLine::fail(std::string problem) {
+  kind_ = Kind::kBad;
+  problem_ = std::move(problem);
+}
+
+bool HexTextLine::mayHaveOffset() const {
+  if (fields_.empty() || fields_[0].prefixed || fields_[0].digits.size() < 4 || fields_[0].digits.size() > 16)
+    return false;
+  return fields_.size() == 1 || digitsFrom(1) == 2;
+}
+
+bool HexTextLine::mayStartAtZero() const {
+  if (fields_.size() < 2 || !(colonOffset_ || mayHaveOffset() || fields_[0].digits.size() >= 6)) return false;
+  return fields_[0].digits.find_first_not_of('0') == std::string_view::npos;
+}
+
+std::size_t HexTextLine::digitsFrom(std::size_t first) const {
+  if (first >= fields_.size()) return 0;
+  const std::size_t digits = fields_[first].digits.size();
+  for (std::size_t i = first + 1; i < fields_.size(); ++i)
+    if (fields_[i].digits.size() != digits) return 0;
+  return digits;
+}
+
+}  // namespace vesk::host
