@@ -68,10 +68,11 @@ constexpr TableRow kInputReports[] = {
     {0x77, "parseAdcDumpPacket"},
 };
 
-/// Null for a name that no decoder has.
-constexpr Decoder resolve(std::string_view name) {
+/// Null for a name that no decoder has. The row, not its function: g++ 12 cannot compare that one at compile time under
+/// -fsanitize=undefined.
+constexpr const NamedDecoder *resolve(std::string_view name) {
   for (const NamedDecoder &row : kDecoders)
-    if (row.name == name) return row.decoder;
+    if (row.name == name) return &row;
   return nullptr;
 }
 
@@ -121,9 +122,9 @@ ReportResult HIDReportVeskPlugin::runParser(const char *report, std::uint32_t re
   const auto row = table.find(reportID);
   if (row == table.end()) return {};
 
-  const vesk::Decoder decoder = vesk::resolve(row->second);
-  if (decoder == nullptr) throw std::invalid_argument("HIDReportVeskPlugin: no decoder is named " + row->second);
-  return (this->*decoder)();
+  const vesk::NamedDecoder *named = vesk::resolve(row->second);
+  if (named == nullptr) throw std::invalid_argument("HIDReportVeskPlugin: no decoder is named " + row->second);
+  return (this->*named->decoder)();
 }
 
 bool HIDReportVeskPlugin::parseReport(const char *report, std::uint32_t reportID, std::int32_t type,

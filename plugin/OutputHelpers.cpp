@@ -108,7 +108,7 @@ ReportValue HIDReportVeskPlugin::arrayWithFloatArray(const void *data, std::uint
 bool HIDReportVeskPlugin::printStrings(const DisplayLines *lines) const {
   if (lines == nullptr) return false;
   std::putchar('\n');
-  std::fwrite(lines->text().data(), 1, lines->text().size(), stdout);
+  if (!lines->empty()) std::fwrite(lines->text().data(), 1, lines->text().size(), stdout);  // else data() is null
   std::putchar('\n');
   return true;
 }
