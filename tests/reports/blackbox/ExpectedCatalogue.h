@@ -1,4 +1,4 @@
-// The black box's modules and events as the documentation lists them, typed for the tests alone.
+// The modules and events that the firmware of the controller counts, typed for the tests alone.
 #pragma once
 
 #include <cstddef>

@@ -9,7 +9,7 @@ using testing::UnorderedElementsAre;
 
 using ValueMap = std::map<std::string, std::string>;
 
-/// As the controller's documentation draws a mask: bit by bit, each put in front of what is there already.
+/// A mask drawn the slow way: bit by bit, each put in front of what is there already.
 std::string drawn(std::uint64_t mask) {
   std::string text;
   for (int i = 1; i <= 48; ++i, mask >>= 1) {
