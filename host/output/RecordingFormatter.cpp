@@ -4,6 +4,7 @@
 #include <map>
 
 #include "host/output/JsonText.h"
+#include "host/output/RecordingLine.h"
 #include "host/report/KnownReports.h"
 #include "values/PrintfFormat.h"
 
@@ -34,26 +35,6 @@ std::string reportDescriptor() {
   return descriptor;
 }
 
-/// " 3 e0 0d 05": the count, then each byte behind a blank.
-void appendCountAndBytes(OutputBuffer &out, std::string_view bytes) {
-  out.append(' ');
-  appendNumber(out, std::uint64_t{bytes.size()});
-  char *end = out.room(3 * bytes.size());
-  for (const char byte : bytes) {
-    *end++ = ' ';
-    end = writeHex(end, static_cast<unsigned char>(byte), 2, false);
-  }
-  out.advanceTo(end);
-  out.append('\n');
-}
-
-/// At least six digits.
-void appendSixDigits(OutputBuffer &out, std::int64_t number) {
-  std::string digits = std::to_string(number);
-  if (digits.size() < 6) digits.insert(0, 6 - digits.size(), '0');
-  out.append(digits);
-}
-
 class RecordingFormatter : public Formatter {
  public:
   bool isStateless() const override { return false; }
@@ -71,9 +52,8 @@ class RecordingFormatter : public Formatter {
       return;
     }
     turnTo(out, report);
-    out.append(report.type == ReportType::kInput ? "E:" : "F:");
-    appendTime(out, report, findings);
-    appendCountAndBytes(out, report.bytes);
+    moveTime(report, findings);
+    appendRecordingLine(out, report.type, lastMicroseconds_, report.bytes);
   }
 
  private:
@@ -92,8 +72,7 @@ class RecordingFormatter : public Formatter {
   }
 
   static void appendHeader(OutputBuffer &out, const SourceReport &report) {
-    out.append("R:");
-    appendCountAndBytes(out, reportDescriptor());
+    appendDescriptorLine(out, reportDescriptor());
     out.append("N: Vesk controller");
     if (!report.device.empty()) {
       out.append(", device ");
@@ -103,20 +82,13 @@ class RecordingFormatter : public Formatter {
     out.append(formatted<"\nI: 3 %04x %04x\n">(ids >> 16, ids & 0xFFFF));
   }
 
-  /// Microseconds, rounded to the nearest. A report without a time has that of the one before it, so that the order
-  /// stays what it was.
-  void appendTime(OutputBuffer &out, const SourceReport &report, std::vector<Finding> &findings) {
-    if (report.timeNs) {
-      if (*report.timeNs < 0)
-        findings.push_back({&kNegativeTime, kNegativeTime.severity,
-                            "its time is before the start of the input; recorded at the start"});
-      const std::int64_t nanoseconds = std::max<std::int64_t>(*report.timeNs, 0);
-      lastMicroseconds_ = nanoseconds / 1000 + (nanoseconds % 1000 >= 500 ? 1 : 0);
-    }
-    out.append(' ');
-    appendSixDigits(out, lastMicroseconds_ / 1'000'000);
-    out.append('.');
-    appendSixDigits(out, lastMicroseconds_ % 1'000'000);
+  /// A report without a time has that of the one before it, so that the order stays what it was.
+  void moveTime(const SourceReport &report, std::vector<Finding> &findings) {
+    if (!report.timeNs) return;
+    if (*report.timeNs < 0)
+      findings.push_back(
+          {&kNegativeTime, kNegativeTime.severity, "its time is before the start of the input; recorded at the start"});
+    lastMicroseconds_ = roundedMicroseconds(std::max<std::int64_t>(*report.timeNs, 0));
   }
 
   std::map<std::pair<std::string, std::optional<std::uint32_t>>, std::size_t> devices_;  // to their indexes
