@@ -9,18 +9,12 @@
 #include "host/input/CaptureHandle.h"
 #include "host/input/Input.h"
 #include "host/input/UsbDevices.h"
+#include "host/input/UsbFindings.h"
 #include "host/input/UsbPacket.h"
 #include "host/input/UsbPending.h"
 
 namespace vesk::host {
 
-inline constexpr MessageKind kCutData{"cut-data", Severity::kError, kExitFindings};
-inline constexpr MessageKind kWrongReportId{"wrong-report-id", Severity::kError, kExitFindings};
-inline constexpr MessageKind kIncompleteReport{"incomplete-report", Severity::kError, kExitFindings};
-inline constexpr MessageKind kFailedRead{"failed-read", Severity::kWarning, kExitOk};
-inline constexpr MessageKind kEmptyAnswer{"empty-answer", Severity::kWarning, kExitOk};
-inline constexpr MessageKind kUnansweredRead{"unanswered-read", Severity::kWarning, kExitOk};
-inline constexpr MessageKind kUnprovenInput{"unproven-input", Severity::kWarning, kExitOk};
 inline constexpr MessageKind kCaptureSummary{"capture-summary", Severity::kNote, kExitOk};
 
 /// Pairs requests with answers and puts input reports together. The controller is known by what it speaks: an answer to

@@ -40,4 +40,13 @@ std::optional<std::int64_t> parseSeconds(std::string_view text) {
   return static_cast<std::int64_t>(*seconds * 1'000'000'000 + fraction);
 }
 
+std::string_view takeBytes(std::string_view text, std::string &out) {
+  for (std::string_view word = takeWord(text); !word.empty(); word = takeWord(text)) {
+    const int high = hexDigit(word[0]), low = word.size() == 2 ? hexDigit(word[1]) : -1;
+    if (high < 0 || low < 0) return word;
+    out += static_cast<char>(high * 16 + low);
+  }
+  return {};
+}
+
 }  // namespace vesk::host

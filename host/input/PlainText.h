@@ -4,6 +4,7 @@
 #include <charconv>
 #include <cstdint>
 #include <optional>
+#include <string>
 #include <string_view>
 
 namespace vesk::host {
@@ -51,6 +52,10 @@ constexpr std::string_view takeWord(std::string_view &text) {
   text.remove_prefix(end);
   return word;
 }
+
+/// Bytes of two hex digits each with blanks between them, appended to `out`. Returns the word that is no byte; empty
+/// where all are.
+std::string_view takeBytes(std::string_view text, std::string &out);
 
 /// Takes the next line, without its line end, from the front of a head; false at the end. The last line may be cut.
 constexpr bool takeLine(std::string_view &head, std::string_view &line) {
