@@ -48,6 +48,10 @@ int runProgram(int argc, char **argv) {
   addDecode(app, context);
   addConvert(app, context);
   addReports(app, context);
+  addList(app, context);
+  addRead(app, context);
+  addSnapshot(app, context);
+  addUdevRule(app, context);
 
   try {
     std::vector<std::string> arguments = takeArguments(argc, argv);

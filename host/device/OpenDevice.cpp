@@ -67,8 +67,7 @@ std::string rightsOf(const std::string &node) {
 
 DeviceError denied(HidSystem &system, const std::string &node, int error) {
   std::string text = std::string("cannot be opened: ") + std::strerror(error) + rightsOf(node);
-  std::error_code none;
-  const std::string target = std::filesystem::weakly_canonical(node, none);
+  const std::string target = canonicalNode(node);
   for (const DeviceIdentity &device : system.list())
     if (device.node == target) text += "; this udev rule would help:\n" + udevRule(device);
   while (text.ends_with('\n')) text.pop_back();
@@ -99,6 +98,11 @@ std::string findDevice(std::span<const DeviceIdentity> devices, const std::strin
                      {},
                      {},
                      "more than one device " + what + "; name one of them with --device:" + listed(called)});
+}
+
+std::string canonicalNode(const std::string &path) {
+  std::error_code none;
+  return std::filesystem::weakly_canonical(path, none);
 }
 
 std::unique_ptr<HidNode> openDevice(HidSystem &system, const std::string &name, const Stop &stop) {

@@ -34,6 +34,9 @@ class DeviceError : public std::runtime_error {
 /// that speaks our reports is meant. Throws DeviceError.
 std::string findDevice(std::span<const DeviceIdentity> devices, const std::string &name);
 
+/// The node that a path leads to, links followed, as devices are listed by it.
+std::string canonicalNode(const std::string &path);
+
 /// Opens the device that `name` means. For a second it tries again where rights are missing or the node is: after
 /// hot-plug both come a little later than the device. Throws DeviceError; returns null when a stop was requested.
 std::unique_ptr<HidNode> openDevice(HidSystem &system, const std::string &name, const Stop &stop);

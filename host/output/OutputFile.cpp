@@ -51,13 +51,17 @@ void OutputFile::write(std::string_view bytes) {
   }
 }
 
-void OutputFile::commit() {
-  if (fd_ <= STDERR_FILENO) return;
-  if (!temporary_.empty() && ::fsync(fd_) != 0) fail("cannot be written");
-  if (::close(std::exchange(fd_, -1)) != 0) fail("cannot be written");
+void OutputFile::publish() {
   if (temporary_.empty()) return;
   if (::rename(temporary_.c_str(), path_.c_str()) != 0) fail("cannot take its name");
   temporary_.clear();
+}
+
+void OutputFile::commit() {
+  if (fd_ <= STDERR_FILENO) return;
+  if (!path_.empty() && ::fsync(fd_) != 0) fail("cannot be written");
+  if (::close(std::exchange(fd_, -1)) != 0) fail("cannot be written");
+  publish();
 }
 
 bool OutputFile::isTerminal() const {

@@ -26,6 +26,9 @@ class OutputFile {
 
   /// Writes all of it. Throws OutputError or PipeClosed.
   void write(std::string_view bytes);
+  /// Gives the file its name before it is done, for one that grows for a long time and is whole at any moment.
+  /// Throws OutputError.
+  void publish();
   /// Gives the file its name; what was written before is on disk then. Throws OutputError.
   void commit();
 
