@@ -33,9 +33,10 @@ def parsed(text):
 
 
 def run(*arguments, stdin=""):
-    done = subprocess.run([PROGRAM, *arguments], input=stdin, capture_output=True, text=True, timeout=120)
-    assert (done.returncode, done.stderr) == (0, ""), f"{arguments}: exit code {done.returncode}: {done.stderr}"
-    return done.stdout
+    done = subprocess.run([PROGRAM, *arguments], input=stdin.encode(), capture_output=True, timeout=120)
+    errors = done.stderr.decode()
+    assert (done.returncode, errors) == (0, ""), f"{arguments}: exit code {done.returncode}: {errors}"
+    return done.stdout.decode()
 
 
 def values_in(lines):
@@ -115,7 +116,7 @@ class AgainstReference(unittest.TestCase):
             with self.subTest(path.name):
                 report = bytes.fromhex(re.sub("#.*", "", path.read_text()))
                 self.assertEqual(report[0], int(path.name[:2], 16))
-                self.assertEqual(run("decode", path), path.with_suffix(".txt").read_text())
+                self.assertEqual(run("decode", path), path.with_suffix(".txt").read_bytes().decode())
                 self.check_text(run("decode", "-decimal", path), [report], decimal=True)
                 ((written, exact),) = values_in(run("decode", "-o", "jsonl", path))
                 self.check_value(written, exact, report)
@@ -130,7 +131,7 @@ class AgainstReference(unittest.TestCase):
         path = EXAMPLES / "session.hid"
         reports = [bytes.fromhex(line.split(" ", 3)[3]) for line in path.read_text().splitlines() if line[0] in "EF"]
         self.assertEqual({report[0] for report in reports}, set(reference.REPORTS))
-        self.assertEqual(run("decode", path), path.with_suffix(".txt").read_text())
+        self.assertEqual(run("decode", path), path.with_suffix(".txt").read_bytes().decode())
         self.check_values(run("decode", "-o", "jsonl", path), reports)
 
     def test_random_reports(self):
