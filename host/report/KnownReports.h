@@ -1,4 +1,4 @@
-// The table of the controller's reports: what `reports` lists, what the length checks go by.
+// The table of the controller's reports: what `reports` lists, what `explain` explains, what the length checks go by.
 #pragma once
 
 #include <cstdint>
@@ -6,18 +6,22 @@
 #include <span>
 #include <string_view>
 
+#include "host/report/Field.h"
 #include "host/report/SourceReport.h"
 
 namespace vesk::host {
 
 struct KnownReport {
+  enum class Length : std::uint8_t { kExact, kAtLeast, kText };
+
   std::uint8_t id;
   ReportType type;
   std::string_view name;     // for people and for --report
   std::uint32_t layoutSize;  // bytes with the report ID; for a text, the least that it can have
-  enum class Length : std::uint8_t { kExact, kAtLeast, kText } length;
+  Length length;
   std::string_view decoder;
   std::string_view title;
+  std::span<const FieldRow> fields;  // behind the report ID
 };
 
 /// In the order in which they are listed.
