@@ -2,6 +2,7 @@
 #include "host/input/CaptureReports.h"
 
 #include "host/input/CaptureFile.h"
+#include "values/PrintfFormat.h"
 
 namespace vesk::host {
 
@@ -29,7 +30,7 @@ std::optional<ReportType> typeOnWire(std::uint8_t wire) {
 }
 
 void list(std::string &text, std::uint64_t count, std::string_view what) {
-  if (count != 0) text += ", " + std::to_string(count) + " " + std::string(what);
+  if (count != 0) text += ", " + std::string(what) + " " + std::to_string(count);
 }
 
 }  // namespace
@@ -179,18 +180,17 @@ void CaptureReports::finish(std::uint64_t packets) {
       if (endpoint.assembly.isActive()) incomplete(device, endpoint.assembly);
   });
   while (const auto submit = pending_.takeOldest()) unanswered(*submit);
-  std::string text = std::to_string(packets) + (packets == 1 ? " packet: " : " packets: ") + std::to_string(index_) +
-                     (index_ == 1 ? " report" : " reports");
-  list(text, counts_.answers, "of them answers to requests");
-  list(text, counts_.guessed, "of them without their request, so that the ID chose the type");
-  list(text, counts_.inputs, "of them from interrupt transfers");
+  std::string text = "packets " + std::to_string(packets) + ", reports " + std::to_string(index_);
+  list(text, counts_.answers, "answers to requests");
+  list(text, counts_.guessed, "of these without the request, so that the ID chose the type");
+  list(text, counts_.inputs, "from interrupt transfers");
   list(text, counts_.assembled, "of these put together from pieces");
   list(text, counts_.failed, "failed reads");
   list(text, counts_.empty, "empty answers");
   list(text, counts_.unanswered, "reads without an answer");
   list(text, counts_.cut, "cut by the capture");
   list(text, counts_.incomplete, "incomplete");
-  list(text, counts_.written, "SET_REPORTs, which are not decoded");
+  list(text, counts_.written, "SET_REPORTs (not decoded)");
   list(text, devices_.forgotten(), "devices too many to be remembered");
   list(text, counts_.other, "packets of other traffic");
   sink_.message({&kCaptureSummary, std::string(file_), {}, {}, std::move(text)});
