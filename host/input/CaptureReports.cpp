@@ -105,12 +105,13 @@ void CaptureReports::getReport(const UsbSetup &setup, const UsbPacket &usb) {
   if (isCut(usb, id)) return;
   UsbDevice &device = devices_.get(interface_, usb);
   const auto first = static_cast<std::uint8_t>(usb.data.front());
-  if (first != id)
+  if (first != id) {
     tell(kWrongReportId, id,
-         "the answer begins with " + std::to_string(first) +
+         "the answer begins with " + formatted<"0x%02X">(std::uint32_t{first}) +
              ", not with this ID; its bytes are decoded as what was asked for");
-  else if (known != nullptr)
+  } else if (known != nullptr) {
     device.ours = true;
+  }
   SourceReport report;
   report.bytes = usb.data;
   report.id = id;
