@@ -48,6 +48,7 @@ int runProgram(int argc, char **argv) {
   addDecode(app, context);
   addConvert(app, context);
   addReports(app, context);
+  addExplain(app, context);
   addList(app, context);
   addRead(app, context);
   addSnapshot(app, context);

@@ -2,8 +2,7 @@
 #include "host/output/HexFormatter.h"
 
 #include "host/output/JsonText.h"
-#include "host/report/KnownReports.h"
-#include "values/PrintfFormat.h"
+#include "host/output/ReportHeading.h"
 
 namespace vesk::host {
 
@@ -14,15 +13,7 @@ constexpr std::size_t kBytesALine = 16;
 /// "# feature 0xE3 open-short-result, 57 bytes, 3.000412 s, device 1.7"
 void appendComment(OutputBuffer &out, const SourceReport &report) {
   out.append("# ");
-  out.append(typeName(report.type));
-  out.append(formatted<" 0x%02X">(report.id));
-  if (const KnownReport *known = findReport(report.id)) {
-    out.append(' ');
-    out.append(known->name);
-  }
-  out.append(", ");
-  appendNumber(out, std::uint64_t{report.bytes.size()});
-  out.append(report.bytes.size() == 1 ? " byte" : " bytes");
+  appendReportName(out, report);
   if (report.timeNs) {
     out.append(", ");
     appendSeconds(out, *report.timeNs);

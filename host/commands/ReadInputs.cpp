@@ -1,0 +1,47 @@
+// Reading of inputs: their kind, their reports, and what is told at the end of each.
+#include "host/commands/ReadInputs.h"
+
+#include "host/input/ByteSource.h"
+
+namespace vesk::host {
+
+namespace {
+
+void readInput(ByteSource &source, const InputOptions &options, Pipeline &pipeline) {
+  const std::string_view head = source.peek(kHeadSize).substr(0, kHeadSize);
+  if (head.empty()) {
+    pipeline.message({&kNoReports, source.name(), {}, {}, "the input is empty"});
+    return;
+  }
+  const InputKind &kind = options.kind == "auto" ? detectInputKind(head) : *findInputKind(options.kind);
+  pipeline.message({&kInputKind, source.name(), {}, {}, "read as " + std::string(kind.title)});
+  ReadOptions readOptions = options.read;
+  readOptions.kindForced = options.kind != "auto";
+  kind.read(source, readOptions, pipeline);
+}
+
+void readFile(const std::string &path, const InputOptions &options, Pipeline &pipeline) {
+  const std::string name = path == "-" ? "(standard input)" : path;
+  try {
+    readInput(*ByteSource::open(path), options, pipeline);
+  } catch (const InputError &error) {
+    pipeline.message({&kUnreadable, name, {}, {}, error.what()});
+  }
+  pipeline.finishFile(name);
+}
+
+}  // namespace
+
+void readInputs(const InputOptions &options, Pipeline &pipeline) {
+  for (const std::string &hex : options.hexReports) {
+    ByteSource source("--hex", hex);
+    InputOptions asHex = options;
+    asHex.kind = "hex";
+    readInput(source, asHex, pipeline);
+    pipeline.finishFile(source.name());
+  }
+  for (const std::string &file : options.files) readFile(file, options, pipeline);
+  if (options.files.empty() && options.hexReports.empty()) readFile("-", options, pipeline);
+}
+
+}  // namespace vesk::host
