@@ -1,4 +1,6 @@
 // `decode` and `convert`: recordings in, display lines, values or reports out.
+#include <unistd.h>
+
 #include <memory>
 
 #include "host/commands/Command.h"
@@ -17,10 +19,12 @@ struct Options {
 
 void run(Options &options, CommandContext &context) {
   options.output.format.arguments = context.arguments;
+  OutputFile output(options.output.file);
   Messages::Options messageOptions = context.messages;
   messageOptions.lenient = options.output.lenient;
+  messageOptions.overProgress = options.input.showProgress =
+      !messageOptions.quiet && ::isatty(STDERR_FILENO) == 1 && !output.isTerminal();
   Messages messages(messageOptions);
-  OutputFile output(options.output.file);
   const auto formatter = options.output.makeFormatter();
   Pipeline pipeline(options.output.pipeline(), options.input.filter, *formatter, output, messages);
   pipeline.begin();

@@ -7,6 +7,8 @@ namespace vesk::host {
 
 namespace {
 
+constexpr double kMostSeconds = 9e9;  // 285 years: what 64 bits of nanoseconds hold
+
 std::int64_t nanoseconds(double seconds) {
   return static_cast<std::int64_t>(std::llround(seconds * 1e9));
 }
@@ -66,11 +68,13 @@ void InputOptions::addTo(CLI::App &command) {
       .add_option_function<double>(
           "--from", [this](double seconds) { filter.fromNs = nanoseconds(seconds); },
           "take reports from this time on, in seconds from the start of the input")
+      ->check(CLI::Range(-kMostSeconds, kMostSeconds))
       ->type_name("SECONDS")
       ->group("Filters");
   command
       .add_option_function<double>(
           "--to", [this](double seconds) { filter.toNs = nanoseconds(seconds); }, "and up to this time")
+      ->check(CLI::Range(-kMostSeconds, kMostSeconds))
       ->type_name("SECONDS")
       ->group("Filters");
 }

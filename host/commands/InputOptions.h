@@ -18,6 +18,7 @@ struct InputOptions {
   std::string kind = "auto";
   ReadOptions read;
   Filter filter;
+  bool showProgress = false;
 
   /// Adds the files, --hex, --input-format, --type, --split and the filters to a command.
   void addTo(CLI::App &command);

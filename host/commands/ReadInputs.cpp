@@ -1,6 +1,7 @@
 // Reading of inputs: their kind, their reports, and what is told at the end of each.
 #include "host/commands/ReadInputs.h"
 
+#include "host/diagnostics/Progress.h"
 #include "host/input/ByteSource.h"
 
 namespace vesk::host {
@@ -23,7 +24,15 @@ void readInput(ByteSource &source, const InputOptions &options, Pipeline &pipeli
 void readFile(const std::string &path, const InputOptions &options, Pipeline &pipeline) {
   const std::string name = path == "-" ? "(standard input)" : path;
   try {
-    readInput(*ByteSource::open(path), options, pipeline);
+    std::optional<Progress> progress;
+    ByteSource::Watch watch;
+    if (options.showProgress) {
+      progress.emplace(name);
+      watch = [&](std::uint64_t read, std::optional<std::uint64_t> size) {
+        progress->update(read, size, pipeline.reports());
+      };
+    }
+    readInput(*ByteSource::open(path, watch), options, pipeline);
   } catch (const InputError &error) {
     pipeline.message({&kUnreadable, name, {}, {}, error.what()});
   }

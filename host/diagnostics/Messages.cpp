@@ -3,6 +3,7 @@
 
 #include <algorithm>
 
+#include "host/diagnostics/Progress.h"
 #include "values/PrintfFormat.h"
 
 namespace vesk::host {
@@ -47,10 +48,11 @@ void Messages::finishFile(std::string_view file) {
 }
 
 void Messages::print(const Message &message, Severity severity, std::string_view text) const {
-  std::string line;
+  std::string line(options_.overProgress ? kClearLine : "");
+  const std::size_t start = line.size();
   if (!message.file.empty()) line += message.file + ":";
   if (const std::string place = message.place.text(); !place.empty()) line += place + ":";
-  if (!line.empty()) line += ' ';
+  if (line.size() != start) line += ' ';
   const char *colour = severity == Severity::kError     ? "\x1b[1;31m"
                        : severity == Severity::kWarning ? "\x1b[1;35m"
                                                         : "\x1b[1;36m";

@@ -19,6 +19,7 @@ class Messages {
     bool verbose = false;  // notes too, and every message rather than the first of its kind
     bool lenient = false;
     bool colour = false;
+    bool overProgress = false;  // a progress line may stand where a message is going to be printed
   };
 
   /// A message that was kept, with how often its kind was seen in its file.

@@ -18,20 +18,30 @@ constexpr std::size_t kPiece = std::size_t{256} << 10;  // larger ones were not 
 
 class FileBytes : public RawBytes {
  public:
-  explicit FileBytes(int fd) : fd_(fd) {}
+  FileBytes(int fd, ByteSource::Watch watch) : fd_(fd), watch_(std::move(watch)) {
+    struct stat status {};
+    if (::fstat(fd, &status) == 0 && S_ISREG(status.st_mode)) size_ = static_cast<std::uint64_t>(status.st_size);
+  }
   ~FileBytes() override {
     if (fd_ != STDIN_FILENO) ::close(fd_);
   }
+  FileBytes(const FileBytes &) = delete;
+  FileBytes &operator=(const FileBytes &) = delete;
+
   std::size_t read(char *out, std::size_t size) override {
-    for (;;) {
-      const ssize_t got = ::read(fd_, out, size);
-      if (got >= 0) return static_cast<std::size_t>(got);
+    ssize_t got = 0;
+    while ((got = ::read(fd_, out, size)) < 0)
       if (errno != EINTR) throw InputError(std::strerror(errno));
-    }
+    read_ += static_cast<std::uint64_t>(got);
+    if (watch_) watch_(read_, size_);
+    return static_cast<std::size_t>(got);
   }
 
  private:
   int fd_;
+  ByteSource::Watch watch_;
+  std::uint64_t read_ = 0;
+  std::optional<std::uint64_t> size_;
 };
 
 class MemoryBytes : public RawBytes {
@@ -92,7 +102,7 @@ class GzipBytes : public RawBytes {
 
 }  // namespace
 
-std::unique_ptr<ByteSource> ByteSource::open(const std::string &path) {
+std::unique_ptr<ByteSource> ByteSource::open(const std::string &path, Watch watch) {
   const bool standardInput = path == "-";
   const std::string name = standardInput ? "(standard input)" : path;
   int fd = STDIN_FILENO;
@@ -100,7 +110,7 @@ std::unique_ptr<ByteSource> ByteSource::open(const std::string &path) {
     fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
     if (fd < 0) throw InputError(std::strerror(errno));
   }
-  auto source = std::make_unique<ByteSource>(name, std::make_unique<FileBytes>(fd));
+  auto source = std::make_unique<ByteSource>(name, std::make_unique<FileBytes>(fd, std::move(watch)));
   if (!source->peek(2).starts_with("\x1f\x8b")) return source;
   return std::make_unique<ByteSource>(name, std::make_unique<GzipBytes>(std::move(source)));
 }

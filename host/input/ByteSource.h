@@ -2,7 +2,9 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <memory>
+#include <optional>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -28,8 +30,12 @@ class ByteSource {
   /// How far peek() can look.
   static constexpr std::size_t kMostAhead = std::size_t{4} << 20;
 
+  /// Called after each read with the bytes that were read so far and how many there are in all, where that is known;
+  /// both as they lie in the file, packed or not.
+  using Watch = std::function<void(std::uint64_t read, std::optional<std::uint64_t> size)>;
+
   /// Opens a file, or standard input for "-"; gzip is unpacked on the way. Throws InputError.
-  static std::unique_ptr<ByteSource> open(const std::string &path);
+  static std::unique_ptr<ByteSource> open(const std::string &path, Watch watch = {});
   ByteSource(std::string name, std::unique_ptr<RawBytes> raw);
   /// Reads from a text of its own.
   ByteSource(std::string name, std::string bytes);

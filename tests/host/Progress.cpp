@@ -1,0 +1,47 @@
+// The progress line's words, and when it is drawn.
+#include "host/diagnostics/Progress.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdio>
+
+namespace vesk::host {
+namespace {
+
+TEST(ProgressText, TellsTheShareTheRateAndWhatIsLeft) {
+  EXPECT_EQ(progressText("s.pcapng", 450'000'000, 1'000'000'000, 900'000, 3.0),
+            "s.pcapng  45% of 1.0 GB  900000 reports  300000/s  4 s left");
+}
+
+TEST(ProgressText, TellsTheBytesWhereTheSizeIsNotKnown) {
+  EXPECT_EQ(progressText("(standard input)", 12'345'678, std::nullopt, 10, 2.0),
+            "(standard input)  12 MB  10 reports  5/s");
+}
+
+TEST(ProgressText, BelievesNoSizeThatWasPassed) {
+  EXPECT_EQ(progressText("growing", 2000, 1000, 1, 1.0), "growing  2.0 kB  1 reports  1/s");
+}
+
+TEST(ProgressText, WritesSizesInThreeDigits) {
+  const auto size = [](std::uint64_t bytes) { return progressText("f", bytes, std::nullopt, 0, 0); };
+  EXPECT_EQ(size(0), "f  0 B  0 reports");
+  EXPECT_EQ(size(999), "f  999 B  0 reports");
+  EXPECT_EQ(size(1'000), "f  1.0 kB  0 reports");
+  EXPECT_EQ(size(9'949), "f  9.9 kB  0 reports");
+  EXPECT_EQ(size(9'951), "f  10 kB  0 reports");
+  EXPECT_EQ(size(999'500), "f  1.0 MB  0 reports");
+  EXPECT_EQ(size(5'000'000'000'000'000), "f  5000 TB  0 reports");
+}
+
+TEST(Progress, IsSilentInShortRuns) {
+  std::FILE *terminal = std::tmpfile();
+  {
+    Progress progress("f", terminal);
+    progress.update(1, 2, 1);
+  }
+  EXPECT_EQ(std::ftell(terminal), 0);
+  std::fclose(terminal);
+}
+
+}  // namespace
+}  // namespace vesk::host
