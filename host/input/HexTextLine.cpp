@@ -170,13 +170,15 @@ void HexTextLine::takeField(std::string_view line, std::size_t begin, std::size_
 /// A line with words: a label where most of it is words, with or without data behind it; else a slip.
 void HexTextLine::judgeWords(std::string_view line) {
   const std::size_t all = words_ + fields_.size(), likeHex = likeHex_;
+  // A line with an offset is never a label.
+  const bool offset = !fields_.empty() && fields_[0].column == 1 && fields_[0].digits.size() >= 6;
   const std::string problem =
       quoted(firstWord_) + " in column " + std::to_string(firstWordAt_) + " is no hexadecimal byte";
   if (dataBehindLabel(line)) {
     kind_ = Kind::kData;
     hasLabel_ = true;
     isRun_ = false;
-  } else if (2 * likeHex < all) {
+  } else if (2 * likeHex < all && !offset) {
     kind_ = Kind::kLabel;
   } else {
     fail(problem);

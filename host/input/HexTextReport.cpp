@@ -2,12 +2,12 @@
 #include "host/input/HexTextReport.h"
 
 #include <algorithm>
+#include <charconv>
 
 #include "host/input/FoundReports.h"
 #include "host/input/HexTextLayout.h"
 #include "host/input/PlainText.h"
 #include "host/report/KnownReports.h"
-#include "values/PrintfFormat.h"
 
 namespace vesk::host {
 
@@ -27,8 +27,11 @@ bool consistsOf(std::string_view text, std::string_view characters) {
   return text.find_first_not_of(characters) == std::string_view::npos;
 }
 
-std::string hexOffset(std::uint64_t offset) {
-  return formatted<"0x%llX">(static_cast<unsigned long long>(offset));
+/// An offset as its neighbours are spelled.
+std::string offsetLike(std::string_view neighbour, std::uint64_t offset, int base) {
+  char digits[32];
+  const std::string text(digits, std::to_chars(digits, digits + sizeof digits, offset, base).ptr);
+  return std::string(neighbour.size() - std::min(neighbour.size(), text.size()), '0') + text;
 }
 
 }  // namespace
@@ -113,30 +116,29 @@ void HexTextReport::add(const HexTextLine &line, std::uint64_t number) {
 }
 
 void HexTextReport::addBytes(const HexTextLine &line, std::uint64_t number, Row &row) {
-  bool first = true;
+  const auto wrong = [&](const HexTextLine::Field &field, std::string_view what) {
+    fail(kBadInput, number,
+         (field.prefixed ? "\"0x" : "\"") + std::string(field.digits.substr(0, 24)) + "\" in column " +
+             std::to_string(field.column) + std::string(what));
+  };
   for (const auto &field : line.fields()) {
     const std::string_view digits = field.digits;
-    const bool single = digits.size() == 1;
-    if (digits.size() % 2 != 0 && !single) {
-      if (!first || row.offset.empty()) {
-        const char *const decimal = consistsOf(digits, "0123456789") ? "; decimal numbers are not read" : "";
-        return fail(kBadInput, number,
-                    "\"" + std::string(digits.substr(0, 24)) + "\" in column " + std::to_string(field.column) +
-                        " has an odd number of digits" + decimal);
-      }
-      row.firstIsBytes = false;
-    } else if (field.prefixed && digits.size() > 2 && line.fields().size() > 1) {
-      return fail(kBadInput, number,
-                  "0x" + std::string(digits.substr(0, 24)) + " in column " + std::to_string(field.column) +
-                      " is more than a byte");
-    } else if (single) {
+    const bool mayBeOffset = &field == &line.fields()[0] && !row.offset.empty();
+    if (digits.size() == 1) {
       data_ += static_cast<char>(hexDigit(digits[0]));
+    } else if (digits.size() % 2 != 0) {
+      row.firstIsBytes = false;
+      if (!mayBeOffset)
+        return wrong(field, consistsOf(digits, "0123456789")
+                                ? " has an odd number of digits; decimal numbers are not read"
+                                : " has an odd number of digits");
+    } else if (field.prefixed && digits.size() > 2 && line.fields().size() > 1 && !mayBeOffset) {
+      return wrong(field, " is more than a byte");
     } else {
       for (std::size_t i = 0; i < digits.size(); i += 2)
         data_ += static_cast<char>(hexDigit(digits[i]) * 16 + hexDigit(digits[i + 1]));
     }
-    if (first) row.middle = data_.size();
-    first = false;
+    if (&field == &line.fields()[0]) row.middle = data_.size();
   }
 }
 
@@ -162,23 +164,26 @@ bool HexTextReport::hasOffsets() const {
   if (rows_[0].middle == rowEnd(0) || !std::all_of(rows_.begin(), rows_.end(), mayBe)) return false;
   if (!rows_[0].firstIsBytes || consistsOf(rows_[0].offset, "0")) return true;
   if (rows_.size() < 2) return false;
-  for (const int base : {16, 8, 10}) {
+  for (const int base : bases()) {
     const auto first = parseNumber(rows_[0].offset, base), second = parseNumber(rows_[1].offset, base);
     if (first && second && *second == *first + (rowEnd(0) - rows_[0].middle)) return true;
   }
   return false;
 }
 
-/// Nothing says whether offsets are hexadecimal, octal or decimal but that they have to agree with the bytes. od's
-/// seven digits are octal or decimal.
+/// The number systems that the offsets may be in; what agrees with the bytes decides. od's seven digits are octal or
+/// decimal, and xxd can be asked for decimal ones.
+std::vector<int> HexTextReport::bases() const {
+  if (!rows_[0].colon && rows_[0].offset.size() == 7) return {8, 10};
+  return {16, 10};
+}
+
 void HexTextReport::joinByOffsets() {
-  const bool likeOd = !rows_[0].colon && rows_[0].offset.size() == 7;
-  const std::vector<int> bases = likeOd ? std::vector{8, 10, 16} : std::vector{16, 8, 10};
-  for (const int base : bases) {
+  for (const int base : bases()) {
     if (joinByOffsets(base, false)) return;
     bytes_.clear();
   }
-  joinByOffsets(bases[0], true);
+  joinByOffsets(bases()[0], true);
 }
 
 bool HexTextReport::joinByOffsets(int base, bool report) {
@@ -194,15 +199,18 @@ bool HexTextReport::joinByOffsets(int base, bool report) {
     const auto offset = parseNumber(row.offset, base);
     const bool hasOffset = row.colon == rows_[0].colon && offset;
     const std::uint64_t expected = *start + bytes_.size();
-    if (!hasOffset) return wrong(row.line, "an offset was expected at the start of the line, " + hexOffset(expected));
+    if (!hasOffset)
+      return wrong(row.line,
+                   "an offset was expected at the start of the line, " + offsetLike(rows_[0].offset, expected, base));
     if (row.repeatBefore) {
       if (*offset < expected || *offset - expected > kMostReportBytes || before.empty() ||
           (*offset - expected) % before.size() != 0)
-        return wrong(row.line, "offset " + row.offset + " is no whole number of lines behind " + hexOffset(expected) +
+        return wrong(row.line, "offset " + row.offset + " is no whole number of lines behind " +
+                                   offsetLike(rows_[0].offset, expected, base) +
                                    ", where \"*\" repeats the line before");
       for (std::uint64_t left = *offset - expected; left != 0; left -= before.size()) bytes_ += before;
     } else if (*offset != expected) {
-      return wrong(row.line, "offset " + row.offset + " where " + hexOffset(expected) +
+      return wrong(row.line, "offset " + row.offset + " where " + offsetLike(rows_[0].offset, expected, base) +
                                  " was expected; a line is missing or has too few bytes");
     }
     if (bytes_.size() > kMostReportBytes) return wrong(row.line, "the report has more than 65536 bytes");

@@ -1,0 +1,429 @@
+// Hex text: every layout of the same bytes as the tools print it, the traps in them, and what is refused.
+#include "tests/host/ReadInput.h"
+
+namespace test {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+
+// 0x76, then 0x20 to 0x47: the text column of a dump ends with what looks like hex.
+const std::string kSample = bytesOf(
+    "76 20 21 22 23 24 25 26 27 28 29 2a 2b 2c 2d 2e 2f 30 31 32 33 34 35 36 37 38 39 3a 3b 3c 3d 3e 3f 40 41 42 43 44 "
+    "45 46 47");
+const std::string kSummary = bytesOf("e0 0d 05 00 21 40 24");
+
+void expectOne(std::string_view text, const std::string &bytes) {
+  SCOPED_TRACE(text);
+  EXPECT_EQ(detectedKind(text), "hex");
+  const ReadResult result = readInput(text);
+  EXPECT_THAT(result.bytes(), ElementsAre(bytes));
+  EXPECT_THAT(result.said(), IsEmpty());
+}
+
+void expectRefused(std::string_view text, std::string_view code, std::string_view words, std::string_view place = "1",
+                   int exitCode = 3) {
+  SCOPED_TRACE(text);
+  const ReadResult result = readInput(text, "hex");
+  EXPECT_THAT(result.reports, IsEmpty());
+  ASSERT_FALSE(result.messages.empty());
+  EXPECT_EQ(result.messages[0].code, code);
+  EXPECT_EQ(result.messages[0].place, place);
+  EXPECT_EQ(result.messages[0].exitCode, exitCode);
+  EXPECT_THAT(result.messages[0].text, HasSubstr(words));
+}
+
+TEST(HexTextInput, ReadsEveryLayoutOfTheSameBytes) {
+  expectOne(R"(00000000: 7620 2122 2324 2526 2728 292a 2b2c 2d2e  v !"#$%&'()*+,-.
+00000010: 2f30 3132 3334 3536 3738 393a 3b3c 3d3e  /0123456789:;<=>
+00000020: 3f40 4142 4344 4546 47                   ?@ABCDEFG
+)",
+            kSample);
+  expectOne(R"(00000000: 76 20 21 22 23 24 25 26  v !"#$%&
+00000008: 27 28 29 2A 2B 2C 2D 2E  '()*+,-.
+00000010: 2F 30 31 32 33 34 35 36  /0123456
+00000018: 37 38 39 3A 3B 3C 3D 3E  789:;<=>
+00000020: 3F 40 41 42 43 44 45 46  ?@ABCDEF
+00000028: 47                       G
+)",
+            kSample);
+  expectOne(R"(00000000: 7620212223242526 2728292a2b2c2d2e  v !"#$%&'()*+,-.
+00000010: 2f30313233343536 3738393a3b3c3d3e  /0123456789:;<=>
+00000020: 3f40414243444546 47                ?@ABCDEFG
+)",
+            kSample);
+  expectOne(R"(76202122232425262728292a2b2c2d2e2f303132333435363738393a3b3c
+3d3e3f4041424344454647
+)",
+            kSample);
+  expectOne(R"(unsigned char b41[] = {
+  0x76, 0x20, 0x21, 0x22, 0x23, 0x24, 0x25, 0x26, 0x27, 0x28, 0x29, 0x2a,
+  0x2b, 0x2c, 0x2d, 0x2e, 0x2f, 0x30, 0x31, 0x32, 0x33, 0x34, 0x35, 0x36,
+  0x37, 0x38, 0x39, 0x3a, 0x3b, 0x3c, 0x3d, 0x3e, 0x3f, 0x40, 0x41, 0x42,
+  0x43, 0x44, 0x45, 0x46, 0x47
+};
+unsigned int b41_len = 41;
+)",
+            kSample);
+  expectOne(R"(00000000  76 20 21 22 23 24 25 26  27 28 29 2a 2b 2c 2d 2e  |v !"#$%&'()*+,-.|
+00000010  2f 30 31 32 33 34 35 36  37 38 39 3a 3b 3c 3d 3e  |/0123456789:;<=>|
+00000020  3f 40 41 42 43 44 45 46  47                       |?@ABCDEFG|
+00000029
+)",
+            kSample);
+  expectOne(R"(000000 76 20 21 22 23 24 25 26 27 28 29 2a 2b 2c 2d 2e
+000010 2f 30 31 32 33 34 35 36 37 38 39 3a 3b 3c 3d 3e
+000020 3f 40 41 42 43 44 45 46 47
+000029
+)",
+            kSample);
+  expectOne(R"(000000 76 20 21 22 23 24 25 26 27 28 29 2a 2b 2c 2d 2e  >v !"#$%&'()*+,-.<
+000010 2f 30 31 32 33 34 35 36 37 38 39 3a 3b 3c 3d 3e  >/0123456789:;<=><
+000020 3f 40 41 42 43 44 45 46 47                       >?@ABCDEFG<
+000029
+)",
+            kSample);
+  expectOne(R"( 76 20 21 22 23 24 25 26 27 28 29 2a 2b 2c 2d 2e
+ 2f 30 31 32 33 34 35 36 37 38 39 3a 3b 3c 3d 3e
+ 3f 40 41 42 43 44 45 46 47
+)",
+            kSample);
+}
+
+TEST(HexTextInput, ReadsOctalAndDecimalOffsetsBeforeBytes) {
+  expectOne(R"(0000000 76 20 21 22 23 24 25 26 27 28 29 2a 2b 2c 2d 2e
+0000020 2f 30 31 32 33 34 35 36 37 38 39 3a 3b 3c 3d 3e
+0000040 3f 40 41 42 43 44 45 46 47
+0000051
+)",
+            kSample);
+  expectOne(R"(0000000 76 20 21 22 23 24 25 26 27 28 29 2a 2b 2c 2d 2e
+0000016 2f 30 31 32 33 34 35 36 37 38 39 3a 3b 3c 3d 3e
+0000032 3f 40 41 42 43 44 45 46 47
+0000041
+)",
+            kSample);
+}
+
+TEST(HexTextInput, ReadsPlainDigitsInEverySpelling) {
+  for (const char *text : {"E0 0D 05 00 21 40 24",
+                           "e00d0500214024",
+                           "e00d 0500 2140 24",
+                           "0xE0 0x0D 0x05 0x00 0x21 0x40 0x24",
+                           "0xe00d0500214024",
+                           "e0,0d,05,00,21,40,24",
+                           "e0, d, 5, 0, 21, 40, 24",
+                           "[e0, 0d, 05, 00, 21, 40, 24]",
+                           "{ 0xe0, 0x0d, 0x05, 0x00, 0x21, 0x40, 0x24 };",
+                           "E0;0D;05;00;21;40;24",
+                           "e0:0d:05:00:21:40:24",
+                           "\"\\xe0\\x0d\\x05\\x00\\x21\\x40\\x24\"",
+                           "\te0\t0d 05\t00   21 40 24  \r\n",
+                           "\xef\xbb\xbf"
+                           "e0 0d 05 00 21 40 24\n",
+                           "# black box\ne0 0d // severity, count\n05 00 21 # mask\n40 24",
+                           "e0 0d /* severity */ 05 00\n/* two\nlines */ 21 40 24",
+                           "const uint8_t report[7] = { 0xe0, 0x0d, 0x05, 0x00, 0x21, 0x40, 0x24 };",
+                           "Report: e0 0d 05 00 21 40 24",
+                           "  \"usb.capdata\": \"e0:0d:05:00:21:40:24\",",
+                           "report (size 7) (numbered) = e0 0d 05 00 21 40 24",
+                           "> e0 0d 05 00\n> 21 40 24\n",
+                           "0000   e0 0d 05 00 21 40 24                              ....!@$\n",
+                           "E0 0D 05 00\n21 40\n24\n"})
+    expectOne(text, kSummary);
+}
+
+TEST(HexTextInput, ReadsWhatOtherToolsPrint) {
+  expectOne(R"(Opening device, vid/pid: 0x16C0/0x0486
+Reading 64-byte input report 0, 250 msec timeout...read 7 bytes:
+ E0 0D 05 00 21 40 24
+Closing device
+)",
+            kSummary);
+  expectOne("\t0x0000:  e00d 0500 2140 24                        ....!@$\n", kSummary);
+}
+
+TEST(HexTextInput, CutsTheTextColumnByItsPlace) {
+  const std::string trap =
+      bytesOf("76 11 12 13 14 15 16 17 18 19 1a 1b 1c 1d 1e 1f 3f 40 41 42 43 44 45 46 30 31 32 33 20 65 30 20");
+  expectOne(R"(00000000: 76111213 14151617 18191a1b 1c1d1e1f  v...............
+00000010: 3f404142 43444546 30313233 20653020  ?@ABCDEF0123 e0 
+)",
+            trap);
+  expectOne(R"(00000000: 76 11 12 13 14 15 16 17  v.......
+00000008: 18 19 1a 1b 1c 1d 1e 1f  ........
+00000010: 3f 40 41 42 43 44 45 46  ?@ABCDEF
+00000018: 30 31 32 33 20 65 30 20  0123 e0 
+)",
+            trap);
+  expectOne(R"(00000000  76 11 12 13 14 15 16 17  18 19 1a 1b 1c 1d 1e 1f  |v...............|
+00000010  3f 40 41 42 43 44 45 46  30 31 32 33 20 65 30 20  |?@ABCDEF0123 e0 |
+00000020
+)",
+            trap);
+}
+
+TEST(HexTextInput, TakesComments_NotTheTextColumnForComments) {
+  expectOne(R"(00000000: e02f 2a23 2f2f 2f                        ./*#///
+)",
+            bytesOf("e0 2f 2a 23 2f 2f 2f"));
+}
+
+TEST(HexTextInput, TakesAFieldForAnOffsetOnlyWhereTheOffsetsGrow) {
+  // Eight digits first, and bytes behind them: data, for the second line is not eight bytes further.
+  const ReadResult result = readInput("e00d0500 21 40\n24000000 01 02\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("e00d0500214024000000 0102")));
+  EXPECT_THAT(readInput("00000010 e0 21\n00000012 22 23\n").bytes(), ElementsAre(bytesOf("e0212223")));
+  expectOne("00000000: e00d 0500 2140 24\n", kSummary);
+}
+
+TEST(HexTextInput, SaysWhereADumpDoesNotBeginAtZero) {
+  const ReadResult result = readInput("00000010: e00d 0500 2140 24    ....!@$\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary));
+  EXPECT_THAT(result.said(), ElementsAre("dump-begin 1"));
+  EXPECT_THAT(result.messages[0].text, HasSubstr("0x10"));
+}
+
+TEST(HexTextInput, FillsSqueezedLines) {
+  const std::string zeros(1023, '\0');
+  for (const char *text : {R"(00000000  00 00 00 00 00 00 00 00  00 00 00 00 00 00 00 00  |................|
+*
+000003f0  00 00 00 00 00 00 00 00  00 00 00 00 00 00 00     |...............|
+000003ff
+)",
+                           R"(0000000 00 00 00 00 00 00 00 00 00 00 00 00 00 00 00 00
+*
+0001760 00 00 00 00 00 00 00 00 00 00 00 00 00 00 00
+0001777
+)",
+                           R"(0000000 00 00 00 00 00 00 00 00 00 00 00 00 00 00 00 00
+*
+0001008 00 00 00 00 00 00 00 00 00 00 00 00 00 00 00
+0001023
+)",
+                           R"(00000000: 0000 0000 0000 0000 0000 0000 0000 0000  ................
+*
+000003f0: 0000 0000 0000 0000 0000 0000 0000 00    ...............
+)"})
+    expectOne(text, zeros);
+}
+
+TEST(HexTextInput, TakesTheLengthFromTheLastOffset) {
+  expectOne(R"(00000000  00 00 00 00 00 00 00 00  00 00 00 00 00 00 00 00  |................|
+*
+00000400
+)",
+            std::string(1024, '\0'));
+  expectOne(R"(000000 e1 00 00 00 00 00 00 00 00 00 00 00 00 00 00 00
+000010 ff ff ff ff ff ff ff ff ff ff ff ff ff ff ff ff
+*
+000040
+)",
+            bytesOf("e1000000000000000000000000000000") + std::string(48, '\xff'));
+}
+
+TEST(HexTextInput, RefusesSqueezedLinesWithoutAnEnd) {
+  expectRefused("000000 e1 00 00 00\n*\n", "bad-input", "length is unknown", "2", 4);
+  expectRefused(" e1 00 00 00\n*\n 00 01\n", "bad-input", "od -An -v -tx1", "3", 4);
+  expectRefused("*\ne1 00\n", "bad-input", "none before it", "1", 4);
+  expectRefused("000000 e1 00 00 00\n*\n000007\n", "bad-input", "whole number of lines", "3", 4);
+}
+
+TEST(HexTextInput, RefusesAGapThatNoReportHas) {
+  expectRefused("00000000  00 00 00 00\n*\nfffffff0\n", "bad-input", "", "3", 4);
+  expectRefused("00000000: 0000\n*\nffffffffffffffff: 00\n", "bad-input", "", "3", 4);
+}
+
+TEST(HexTextInput, SeesMissingLines) {
+  expectRefused(R"(00000000: 7620 2122 2324 2526 2728 292a 2b2c 2d2e  v !"#$%&'()*+,-.
+00000020: 3f40 4142 4344 4546 47                   ?@ABCDEFG
+)",
+                "bad-input", "00000010 was expected", "2", 4);
+  expectRefused("00000000  76 20 21 22\n00000008  2f 30\n", "bad-input", "was expected", "2", 4);
+  expectRefused("0000000 76 20 21 22\n0000014 2f 30\n", "bad-input", "0000014 where 0000004 was expected", "2", 4);
+  expectRefused("00000000: 7620\n2122\n", "bad-input", "an offset was expected", "2", 4);
+}
+
+TEST(HexTextInput, RefusesWordsByName) {
+  expectRefused("0000000 0de0 0005 4021 0024                    \n0000007\n", "swapped-words", "'hexdump -C'");
+  expectRefused("0000000 0de0 0005 4021 0024\n0000007\n", "swapped-words", "'od -Ax -v -tx1'");
+  expectRefused(" 0de0 0005 4021 0024\n", "swapped-words", "'xxd'");
+  expectRefused("0000000    2076    2221    2423    2625    2827    2a29    2c2b    2e2d\n0000010\n", "swapped-words",
+                "xxd");
+  expectRefused("0000000 22212076 26252423 2a292827 2e2d2c2b\n0000020\n", "swapped-words", "xxd");
+  expectRefused("00000000: 00050de0   244021                    ....!@$\n", "swapped-words", "'xxd -e'");
+  expectRefused("00000000: 22212076 26252423 2a292827 2e2d2c2b  v !\"#$%&'()*+,-.\n", "swapped-words", "'xxd -e'");
+  expectRefused("00000000: 2076 2221 2423 2625 2827 2a29 2c2b 2e2d  v !\"#$%&'()*+,-.\n", "swapped-words", "'xxd -e'");
+}
+
+TEST(HexTextInput, RefusesOctalDecimalAndBits) {
+  expectRefused("0000000 006740 000005 040041 000044\n0000007\n", "octal-text", "'od -Ax -v -tx1'");
+  expectRefused(" 006740 000005 040041 000044\n", "octal-text", "octal");
+  expectRefused("0000000 340 015 005 000 041 100 044\n0000007\n", "octal-text", "octal");
+  expectRefused("0000000   03552   00005   16417   00036                                \n0000007\n", "decimal-text",
+                "'hexdump -C'");
+  expectRefused(
+      "00000000: 11100000 00001101 00000101 00000000 00100001 01000000  ....!@\n"
+      "00000006: 00100100                                               $\n",
+      "bit-text", "'xxd -b'");
+  expectRefused("11100000 00001101 00000101\n", "bit-text", "bits");
+  expectRefused("0000000  -32   13    5    0   33   64   36\n0000007\n", "bad-input", "\"-32\" in column 10", "1", 4);
+  expectRefused("0000000 340  \\r 005  \\0   !   @   $\n0000007\n", "bad-input", "no hexadecimal byte", "1", 4);
+}
+
+TEST(HexTextInput, DoesNotTakeGroupsOfZerosForBits) {
+  expectOne("00000000: 00000000 00000000 00000000 00000000  ................\n", std::string(16, '\0'));
+  expectOne("e0000000 00000000 00000000\n", bytesOf("e00000000000000000000000"));
+}
+
+TEST(HexTextInput, NamesLineAndColumnOfASlip) {
+  expectRefused("e0 0d\n05 0 021 40\n", "bad-input", "\"021\" in column 6 has an odd number of digits", "2", 4);
+  expectRefused("e0 0d 05 00 2g 40 24", "bad-input", "\"2g\" in column 13", "1", 4);
+  expectRefused("g0 0d 05 00 21 40 24", "bad-input", "\"g0\" in column 1", "1", 4);
+  expectRefused("0xe0, 0x1ff, 0x05", "bad-input", "0x1ff", "1", 4);
+  expectRefused("0xe0, 0x0d05, 0x05", "bad-input", "more than a byte", "1", 4);
+  expectRefused("e00d0", "bad-input", "odd number", "1", 4);
+  expectRefused("[118, 119, 100]", "bad-input", "decimal", "1", 4);
+  expectRefused("e0 0d \xff\x01", "bad-input", "\\xff\\x01", "1", 4);
+  expectRefused("b'\\xe0\\x0d\\x05'", "bad-input", "\"b\" in column 1", "1", 4);
+  expectRefused("/* e0 0d 05\n21 40\n", "bad-input", "does not end", "1", 4);
+}
+
+TEST(HexTextInput, LosesOneReportToASlipAndNoOther) {
+  const ReadResult result = readInput("e0 0d 05 00 21 40 24\n\nde 0x\nde 01\n\nde 02\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary, bytesOf("de02")));
+  EXPECT_THAT(result.said(), ElementsAre("bad-input 3"));
+}
+
+TEST(HexTextInput, SeparatesReportsByEmptyLines) {
+  const ReadResult result = readInput("e0 0d 05\n00 21 40 24\n\n\nde 01\n# between\n\nde 02 # last\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary, bytesOf("de01"), bytesOf("de02")));
+  ASSERT_EQ(result.reports.size(), 3u);
+  EXPECT_EQ(result.reports[0].place, "1");
+  EXPECT_EQ(result.reports[1].place, "5");
+  EXPECT_EQ(result.reports[1].index, 1u);
+  EXPECT_EQ(result.reports[1].file, "input");
+  EXPECT_EQ(result.reports[1].timeNs, std::nullopt);
+}
+
+TEST(HexTextInput, AReportGoesOnAcrossACommentLine) {
+  expectOne("e0 0d 05\n# the mask\n00 21 40 24\n", kSummary);
+}
+
+TEST(HexTextInput, SeparatesReportsByOffsetZero) {
+  const ReadResult result = readInput(R"(00000000  e0 0d 05 00 21 40 24                              |....!@$|
+00000007
+00000000  de 01                                             |..|
+00000002
+)");
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary, bytesOf("de01")));
+  EXPECT_THAT(result.said(), IsEmpty());
+  EXPECT_THAT(readInput("00000000: e00d 0500 2140 24    ....!@$\n00000000: de01       ..\n").bytes(),
+              ElementsAre(kSummary, bytesOf("de01")));
+  EXPECT_THAT(readInput("0000000 e0 0d 05 00 21 40 24\n0000007\n0000000 de 01\n0000002\n").bytes(),
+              ElementsAre(kSummary, bytesOf("de01")));
+}
+
+TEST(HexTextInput, SeparatesReportsByLabels) {
+  const ReadResult result =
+      readInput("First one:\ne0 0d 05 00 21 40 24\n==> second.bin <==\nde 01\nE0:\nde 02\n---\nde 03\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary, bytesOf("de01"), bytesOf("de02"), bytesOf("de03")));
+  EXPECT_THAT(result.said(), IsEmpty());
+  EXPECT_THAT(readInput("{0xe0, 0x0d, 0x05, 0x00, 0x21, 0x40, 0x24},\n{0xde, 0x01},\n").bytes(),
+              ElementsAre(kSummary, bytesOf("de01")));
+}
+
+TEST(HexTextInput, AKnownIdAloneBeginsNoReport) {
+  const std::string image = numbered(0x77, 2064);
+  std::string text;
+  for (std::size_t at = 0; at < image.size(); at += 7) text += digitsOf(std::string_view(image).substr(at, 7)) + "\n";
+  expectOne(text, image);  // lines begin with 0xD0, 0xDE, 0xE5 ... in the middle of it
+}
+
+TEST(HexTextInput, ReadsOneReportALineWhereEachIsWhole) {
+  EXPECT_THAT(readInput("e0 0d 05 00 21 40 24\ne0 0c 05 00 21 40 24\nde 01\n").bytes(),
+              ElementsAre(kSummary, bytesOf("e00c0500214024"), bytesOf("de01")));
+  EXPECT_THAT(readInput("e00d0500214024\ne00c0500214024\nde01\nde00\n").bytes(),
+              ElementsAre(kSummary, bytesOf("e00c0500214024"), bytesOf("de01"), bytesOf("de00")));
+}
+
+TEST(HexTextInput, ReadsRunsOfAnalysersAndOfXxdAlike) {
+  const std::string image = numbered(0x76, 792), packet = numbered(0x77, 2064), full = numbered(0xE1, 1023);
+  const std::string lines = digitsOf(image, "%02x", "") + "\n" + digitsOf(image, "%02x", "") + "\n" +
+                            digitsOf(full, "%02x", "") + "\n" + digitsOf(packet, "%02x", "") + "\n" +
+                            digitsOf(kSummary, "%02x", "") + "\n";
+  EXPECT_THAT(readInput(lines).bytes(), ElementsAre(image, image, full, packet, kSummary));
+  EXPECT_THAT(readInput(plainDump(image) + plainDump(image) + plainDump(full) + plainDump(packet) + plainDump(kSummary))
+                  .bytes(),
+              ElementsAre(image, image, full, packet, kSummary));
+  EXPECT_THAT(readInput(digitsOf(image, "%02x", ":") + "\n" + digitsOf(image, "%02x", ":") + "\n").bytes(),
+              ElementsAre(image, image));
+}
+
+TEST(HexTextInput, RunsOfCutReportsStayApart) {
+  EXPECT_THAT(readInput("e00d050021\ne00c050021\n").bytes(), ElementsAre(bytesOf("e00d050021"), bytesOf("e00c050021")));
+  EXPECT_THAT(readInput("e00d05\ne00d0500214024\n").bytes(), ElementsAre(bytesOf("e00d05"), kSummary));
+}
+
+TEST(HexTextInput, ATextReportGoesOnUntilItsZero) {
+  const std::string text = "\xd0" + std::string(70, 'A') + std::string(1, '\0');
+  EXPECT_THAT(readInput(plainDump(text) + plainDump(text)).bytes(), ElementsAre(text, text));
+}
+
+TEST(HexTextInput, TypeFollowsFromTheIdUnlessTheUserSaysOtherwise) {
+  const ReadResult result = readInput("76 01\n\ne0 0d\n\n55 01\n");
+  ASSERT_EQ(result.reports.size(), 3u);
+  EXPECT_EQ(result.reports[0].type, ReportType::kInput);
+  EXPECT_EQ(result.reports[1].type, ReportType::kFeature);
+  EXPECT_EQ(result.reports[2].id, 0x55u);
+  EXPECT_TRUE(result.reports[0].typeGuessed);
+  vesk::host::ReadOptions options;
+  options.forcedType = ReportType::kInput;
+  const ReadResult forced = readInput("e0 0d\n", {}, options);
+  EXPECT_EQ(forced.reports.at(0).type, ReportType::kInput);
+  EXPECT_FALSE(forced.reports.at(0).typeGuessed);
+}
+
+TEST(HexTextInput, BoundsAReport) {
+  std::string lines;
+  for (int i = 0; i < 4096; ++i) lines += "e0 01 02 03 04 05 06 07 08 09 0a 0b 0c 0d 0e 0f\n";
+  EXPECT_EQ(readInput(lines).bytes().at(0).size(), 65536u);
+  lines += "10\n";
+  expectRefused(lines, "bad-input", "65536", "1", 4);
+  expectRefused(digitsOf(std::string(65537, 'v')), "bad-input", "65536", "1", 4);
+  expectRefused(digitsOf(std::string(140000, 'v'), "%02x", ""), "bad-input", "65536", "1", 4);
+}
+
+TEST(HexTextInput, TextWithoutDataIsNoHexText) {
+  EXPECT_NE(detectedKind("To whom it may concern\n\nA bad idea, added.\n"), "hex");
+  EXPECT_NE(detectedKind("<?xml version=\"1.0\"?>\n<a>\n</a>\n"), "hex");
+  EXPECT_THAT(readInput("# nothing\n", "hex").said(), ElementsAre("no-reports"));
+}
+
+TEST(HexTextInput, EveryCutOfEveryLayoutEndsWithAReportOrAMessage) {
+  for (const std::string text : {R"(00000000: 7620 2122 2324 2526 2728 292a 2b2c 2d2e  v !"#$%&'()*+,-.
+00000010: 2f30 3132 3334 3536 3738 393a 3b3c 3d3e  /0123456789:;<=>
+)",
+                                 R"(unsigned char b41[] = {
+  0x76, 0x20, 0x21, 0x22, 0x23
+};
+unsigned int b41_len = 5;
+)",
+                                 R"(00000000  76 20 21 22 23 24 25 26  27 28 29 2a 2b 2c 2d 2e  |v !"#$%&'()*+,-.|
+*
+00000020
+)",
+                                 R"(0000000 0de0 0005 4021 0024
+0000007
+)",
+                                 "76:01:02\n/* 76 */ \"\\x76\" # x\n"})
+    for (std::size_t size = 1; size <= text.size(); ++size) {
+      const ReadResult result = readInput(text.substr(0, size), "hex");
+      EXPECT_TRUE(!result.reports.empty() || !result.said().empty()) << text.substr(0, size);
+      for (const Found &report : result.reports) EXPECT_FALSE(report.bytes.empty());
+    }
+}
+
+}  // namespace
+}  // namespace test
