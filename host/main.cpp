@@ -52,6 +52,8 @@ int runProgram(int argc, char **argv) {
   addList(app, context);
   addRead(app, context);
   addSnapshot(app, context);
+  addWatch(app, context);
+  addRecord(app, context);
   addUdevRule(app, context);
 
   try {
