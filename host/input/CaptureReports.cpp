@@ -100,7 +100,7 @@ void CaptureReports::getReport(const UsbSetup &setup, const UsbPacket &usb) {
   }
   if (usb.dataSize == 0) {
     ++counts_.empty;
-    return tell(kEmptyAnswer, id, "asked for, answered with 0 bytes");
+    return tell(kEmptyRead, id, "asked for, answered with 0 bytes");
   }
   if (isCut(usb, id)) return;
   UsbDevice &device = devices_.get(interface_, usb);

@@ -9,7 +9,7 @@ inline constexpr MessageKind kCutData{"cut-data", Severity::kError, kExitFinding
 inline constexpr MessageKind kWrongReportId{"wrong-report-id", Severity::kError, kExitFindings};
 inline constexpr MessageKind kIncompleteReport{"incomplete-report", Severity::kError, kExitFindings};
 inline constexpr MessageKind kFailedRead{"failed-read", Severity::kWarning, kExitOk};
-inline constexpr MessageKind kEmptyAnswer{"empty-answer", Severity::kWarning, kExitOk};
+inline constexpr MessageKind kEmptyRead{"empty-read", Severity::kWarning, kExitOk};
 inline constexpr MessageKind kUnansweredRead{"unanswered-read", Severity::kWarning, kExitOk};
 inline constexpr MessageKind kUnprovenInput{"unproven-input", Severity::kWarning, kExitOk};
 

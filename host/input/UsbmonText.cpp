@@ -134,7 +134,7 @@ class UsbmonReader {
     if (wireType < 1 || wireType > 3)
       return found_.say(kBadInput, here(),
                         "a report of type " + std::to_string(wireType) + " was asked for; 1, 2 and 3 exist", id);
-    if (length == 0) return found_.say(kEmptyAnswer, here(), "asked for, answered with 0 bytes", id);
+    if (length == 0) return found_.say(kEmptyRead, here(), "asked for, answered with 0 bytes", id);
     if (!bytes_.empty() && static_cast<unsigned char>(bytes_[0]) != id)
       found_.say(kWrongReportId, here(),
                  "the answer begins with " + formatted<"0x%02X">(unsigned{static_cast<unsigned char>(bytes_[0])}) +

@@ -220,7 +220,7 @@ TEST(CaptureTransfers, AnswersOfNoBytes) {
   for (unsigned linkType : {189u, 220u, 249u}) {
     const Outcome outcome = readEvents({getReport(3, 0xE0, 7), answer({}), inputData({})}, {linkType});
     EXPECT_THAT(outcome.reports, IsEmpty());
-    EXPECT_THAT(outcome.codes(), ElementsAre("empty-answer", "no-reports"));
+    EXPECT_THAT(outcome.codes(), ElementsAre("empty-read", "no-reports"));
   }
 }
 
@@ -272,7 +272,7 @@ TEST(CaptureTransfers, OlderUsbpcapWritesThreeStages) {
     EXPECT_FALSE(outcome.reports.at(0).typeGuessed);
     EXPECT_THAT(outcome.codes(), IsEmpty());
   }
-  EXPECT_THAT(readEvents({getReport(3, 0xE0, 7), status}, {249}).codes(), ElementsAre("empty-answer", "no-reports"));
+  EXPECT_THAT(readEvents({getReport(3, 0xE0, 7), status}, {249}).codes(), ElementsAre("empty-read", "no-reports"));
   // Data towards the device, in a stage of its own.
   Event setup = setReport(0xE0, {}), outData = setReport(0xE0, kSummary);
   outData.setup.clear();
