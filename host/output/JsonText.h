@@ -32,9 +32,9 @@ inline constexpr std::size_t kTextNumberRoom = 40;
 template <class Number>
 char *writeNumber(char *out, Number value) noexcept {
   if constexpr (std::is_floating_point_v<Number>) {
-    if (std::isfinite(value)) return std::to_chars(out, out + kTextNumberRoom, value).ptr;
-    std::memcpy(out, "null", 4);
-    return out + 4;
+    if (!std::isfinite(value)) return std::copy_n("null", 4, out);
+    if (value == 0 && std::signbit(value)) return std::copy_n("-0.0", 4, out);  // "-0" is an integer to many readers
+    return std::to_chars(out, out + kTextNumberRoom, value).ptr;
   } else if constexpr (sizeof(Number) == 8) {
     return writeDecimal(out, value);
   } else if constexpr (std::is_signed_v<Number>) {

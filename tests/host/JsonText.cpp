@@ -83,7 +83,8 @@ TEST(JsonNumber, floatsHaveTheFewestDigitsOfSinglePrecision) {
   EXPECT_EQ(number(0.1f), "0.1");
   EXPECT_EQ(number(36.6f), "36.6");
   EXPECT_EQ(number(1.0f), "1");
-  EXPECT_EQ(number(-0.0f), "-0");
+  EXPECT_EQ(number(0.0f), "0");
+  EXPECT_EQ(number(-0.0f), "-0.0");
   EXPECT_EQ(number(16777216.0f), "16777216");
   EXPECT_EQ(number(1e-45f), "1e-45");
   EXPECT_EQ(number(3.4028235e38f), "3.4028235e+38");
