@@ -89,7 +89,8 @@ bool matches(std::string_view head) {
   for (std::string_view text; takeLine(head, text);) {
     line.parse(text);
     if (line.kind() == Kind::kLabel) ++labels;
-    if (line.kind() == Kind::kData || line.kind() == Kind::kBad) ++data;
+    // A slip among bytes, not a sentence with a number in it.
+    if (line.kind() == Kind::kData || (line.kind() == Kind::kBad && line.fields().size() > 1)) ++data;
   }
   return data != 0 && data * kWordsALine >= labels;
 }
