@@ -64,7 +64,7 @@ bool HexTextReport::endsBefore(const HexTextLine &line) const {
   if (isEmpty()) return false;
   if (line.opensArray() || line.hasLabel()) return true;
   if (line.mayStartAtZero() && (rows_.empty() || !rows_[0].offset.empty())) return true;
-  if (problem_ || repeatAt_) return false;
+  if (problem_ || repeatAt_ || data_.empty()) return false;
   if (allRuns_ && line.isRun() && !line.hasColonOffset()) return !continuesRun(line);
   if (rows_.size() != 1 || rows_[0].colon || !rows_[0].offset.empty()) return false;
   const KnownReport *known = findReport(byteAt(data_, 0));

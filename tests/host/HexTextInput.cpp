@@ -284,6 +284,7 @@ TEST(HexTextInput, NamesLineAndColumnOfASlip) {
   expectRefused("0xe0, 0x1ff, 0x05", "bad-input", "0x1ff", "1", 4);
   expectRefused("0xe0, 0x0d05, 0x05", "bad-input", "more than a byte", "1", 4);
   expectRefused("e00d0", "bad-input", "odd number", "1", 4);
+  expectRefused("0000007\ne00d\n", "bad-input", "odd number", "1", 4);
   expectRefused("[118, 119, 100]", "bad-input", "decimal", "1", 4);
   expectRefused("e0 0d \xff\x01", "bad-input", "\\xff\\x01", "1", 4);
   expectRefused("b'\\xe0\\x0d\\x05'", "bad-input", "\"b\" in column 1", "1", 4);
