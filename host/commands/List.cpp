@@ -1,4 +1,6 @@
 // `list`: the HID devices of this machine, and which of them is the controller.
+#include <algorithm>
+
 #include "host/commands/Command.h"
 #include "host/device/Hidraw.h"
 #include "host/device/OpenDevice.h"
@@ -20,15 +22,21 @@ std::string declaredText(const DeviceIdentity &device) {
   return count + (speaksOurReports(device.descriptor) ? " of ours: a controller" : " of ours, by chance");
 }
 
+/// Characters, of which a name may have some that are several bytes long.
+std::size_t width(const std::string &text) {
+  return static_cast<std::size_t>(
+      std::ranges::count_if(text, [](char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; }));
+}
+
 /// Columns as wide as their widest cell, two blanks apart.
 std::string asTable(const std::vector<std::vector<std::string>> &rows) {
   std::vector<std::size_t> widths(rows.front().size());
   for (const auto &row : rows)
-    for (std::size_t k = 0; k < row.size(); ++k) widths[k] = std::max(widths[k], row[k].size());
+    for (std::size_t k = 0; k < row.size(); ++k) widths[k] = std::max(widths[k], width(row[k]));
   std::string table;
   for (const auto &row : rows) {
     std::string line;
-    for (std::size_t k = 0; k < row.size(); ++k) line += row[k] + std::string(widths[k] + 2 - row[k].size(), ' ');
+    for (std::size_t k = 0; k < row.size(); ++k) line += row[k] + std::string(widths[k] + 2 - width(row[k]), ' ');
     table += line.substr(0, line.find_last_not_of(' ') + 1) + "\n";
   }
   return table;

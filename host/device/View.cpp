@@ -14,7 +14,7 @@ namespace {
 constexpr std::size_t kMargin = 2;      // columns before the bars
 constexpr std::size_t kOtherLines = 6;  // title, status, two headings, the axis, and the last line, where the cursor is
 constexpr std::size_t kTallestBars = 16;  // lines
-constexpr const char *kNewLine = "\x1b[K\r\n";
+constexpr const char *kNewLine = "\x1b[K\n";
 
 std::string fixed(double number, int decimals) {
   char text[400];
