@@ -36,4 +36,4 @@ fuzz() {
   }
 }
 export -f fuzz
-printf '%s\n' "${targets[@]}" | xargs -P 2 -I '{}' bash -euo pipefail -c 'fuzz "$1" "$2"' fuzz "$seconds" '{}'
+printf '%s\n' "${targets[@]}" | xargs -P 2 -I '{}' bash -euo pipefail -c "fuzz $seconds {}"
