@@ -24,6 +24,10 @@ std::string padded(std::string_view text, std::size_t width) {
   return cell;
 }
 
+std::string leftPadded(std::string_view text, std::size_t width) {
+  return std::string(text.size() < width ? width - text.size() : 0, ' ') + std::string(text);
+}
+
 std::string lengthText(const KnownReport &report) {
   switch (report.length) {
     case KnownReport::Length::kExact:
@@ -51,6 +55,23 @@ std::string_view keyText(const Field &field) {
   return field.key.empty() ? "(the value itself)" : std::string_view(field.key);
 }
 
+/// How many bytes: a text has as many as it needs.
+std::string widthText(const Field &field) {
+  return field.type == FieldType::kString ? "any" : std::to_string(field.width());
+}
+
+/// A note in lines that a terminal takes, each behind a margin.
+std::string noteLines(std::string_view note) {
+  constexpr std::size_t kMargin = 26, kWidth = 90;
+  std::string lines;
+  while (!note.empty()) {
+    const std::size_t end = note.size() <= kWidth ? note.size() : note.rfind(' ', kWidth);
+    lines += std::string(kMargin, ' ') + std::string(note.substr(0, end)) + "\n";
+    note.remove_prefix(std::min(end + 1, note.size()));
+  }
+  return lines;
+}
+
 /// One row a field, and under it what there is to say about it.
 std::string fieldTable(const std::vector<Field> &fields) {
   std::size_t labelWidth = 9, keyWidth = 12;
@@ -61,12 +82,12 @@ std::string fieldTable(const std::vector<Field> &fields) {
   std::string table = "offset  bytes  type       " + padded("on screen", labelWidth) + "  " +
                       padded("in the value", keyWidth) + "  unit\n";
   for (const Field &field : fields) {
-    std::string row = formatted<"%6u  ">(field.offset) + formatted<"%5u  ">(field.width()) +
+    std::string row = formatted<"%6u  ">(field.offset) + leftPadded(widthText(field), 5) + "  " +
                       padded(typeText(field), 9) + "  " + padded(labelText(field), labelWidth) + "  " +
                       padded(keyText(field), keyWidth) + "  " + field.unit;
     row.resize(row.find_last_not_of(' ') + 1);
     table += row + "\n";
-    if (!field.note.empty()) table += std::string(26, ' ') + field.note + "\n";
+    table += noteLines(field.note);
   }
   return table;
 }
@@ -78,7 +99,7 @@ std::string explanation(const KnownReport &report) {
           std::string(report.decoder) + "\n";
   for (const FieldRow &row : report.fields)
     if (row.type == FieldType::kModules)
-      text += "from byte " + std::to_string(row.offset) + ": " + std::string(row.note) + "\n";
+      text += "from byte " + std::to_string(row.offset) + ":\n" + noteLines(row.note);
   return text + "\n" + fieldTable(layoutOf(report));
 }
 

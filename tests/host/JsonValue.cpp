@@ -38,7 +38,7 @@ TEST(JsonValue, bareValuesStandBare) {
 TEST(JsonValue, dictionariesKeepTheirOrderAndNesting) {
   Dictionary tree(3, 2);
   tree.add("Z", std::uint16_t{5});
-  Dictionary &inner = tree.addDictionary("INNER", 2);
+  auto &&inner = tree.addDictionary("INNER", 2);
   inner.add("INIT time ms", std::uint32_t{1});
   inner.add("b", std::string("x\ny"));
   tree.add("A", std::vector<std::int32_t>{-1, 0, 1});
