@@ -6,6 +6,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <utility>
 #include <variant>
 #include <vector>
 
@@ -95,7 +96,7 @@ class __attribute__((visibility("default"))) HIDReportVeskPlugin {
   ReportResult parseWatchDogReport() const;
   ReportResult parsePowerModeStats() const;
 
-  // Pieces of the black-box and open/short reports that stand for themselves.
+  // Pieces of the black-box and open/short reports that stand for themselves. Texts end in a zero and are never null.
 
   /// Stores the name of a severity level, a constant; "UNKNOWN" above 5.
   void errorLevelToString(std::uint8_t level, const char **levelStr) const;

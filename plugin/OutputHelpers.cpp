@@ -59,7 +59,7 @@ template <class Field>
 void addIntegers(DisplayLines &lines, const void *data, std::uint32_t count, const char *format) {
   const std::string_view text = format;
   if (text == "%08x ")
-    addLinesAs<"%08x ", Field>(lines, data, count);
+    addHexLines<Field>(lines, data, count);
   else if (text == "%14d ")
     addLinesAs<"%14d ", Field>(lines, data, count);
   else

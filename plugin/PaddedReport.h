@@ -16,8 +16,11 @@ class PaddedReport {
  public:
   PaddedReport() : PaddedReport(std::string_view()) {}
   explicit PaddedReport(std::string_view bytes) { assign(bytes); }
+  // Copies only: what was moved from would not keep the promise.
+  PaddedReport(const PaddedReport &) = default;
+  PaddedReport &operator=(const PaddedReport &) = default;
 
-  /// Takes a copy of `bytes`, the report ID first.
+  /// Takes a copy of `bytes`, the report ID first. REQUIRES: not a view of this object.
   void assign(std::string_view bytes) {
     const std::size_t readable = std::max(bytes.size(), kReadableBytes) + 1;
     if (memory_.size() < readable) memory_.resize(readable);

@@ -29,6 +29,8 @@ class DisplayLines {
   /// All lines, each followed by a line feed.
   std::string_view text() const noexcept { return {text_.get(), used_}; }
 
+  // What is appended must not be a view of this object.
+
   /// Appends one line as it stands.
   void add(std::string_view line);
 

@@ -11,7 +11,7 @@
 
 namespace vesk {
 
-/// The most that any function here may touch behind `out`, digits and scratch together.
+/// The most that writeDecimal and writeHex may touch behind `out`, digits and scratch together.
 inline constexpr std::size_t kNumberRoom = 24;
 
 extern const std::array<std::array<char, 4>, 10000> kFourDigits;  // "0000" to "9999"

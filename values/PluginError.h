@@ -16,6 +16,7 @@ struct PluginError {
 
   /// The message, or an empty text where there is none.
   std::string localizedDescription() const;
-  /// Domain, code and message on one line; control characters of the message are escaped there.
+  /// Domain, code and message on one line: what would end it or move a cursor (control characters, U+2028, U+2029) is
+  /// written as \xNN, byte by byte.
   std::string description() const;
 };

@@ -12,9 +12,11 @@
 #include <string>
 #include <string_view>
 #include <type_traits>
+#include <utility>
 
 #include "values/LittleEndian.h"
 #include "values/NumberText.h"
+#include "values/TextBlocks.h"
 
 namespace vesk {
 
@@ -22,36 +24,6 @@ template <std::size_t Size>
 struct FormatText {
   char text[Size];
   consteval FormatText(const char (&literal)[Size]) { std::copy_n(literal, Size, text); }  // NOLINT: implicit
-};
-
-/// A text of at most 48 characters that stands right-aligned in `Width` columns, padded by the compiler: what "%40s"
-/// would do with it, as one block to copy.
-template <std::size_t Width>
-struct Label {
-  static constexpr std::size_t kBlock = 48;
-  char text[kBlock]{};
-  std::uint8_t size = 0;
-
-  template <std::size_t Size>
-  consteval Label(const char (&literal)[Size]) {  // NOLINT: implicit
-    static_assert(Size - 1 <= kBlock && Width <= kBlock);
-    const std::size_t blanks = Size - 1 < Width ? Width - (Size - 1) : 0;
-    std::fill_n(text, blanks, ' ');
-    std::copy_n(literal, Size - 1, text + blanks);
-    size = static_cast<std::uint8_t>(blanks + Size - 1);
-  }
-};
-
-/// A ready text in a block of fixed size, for rows that are chosen from a table.
-template <std::size_t Block>
-struct TextBlock {
-  static constexpr std::size_t kBlock = Block;
-  char text[Block]{};
-  std::uint8_t size = 0;
-
-  constexpr void append(std::string_view piece) {
-    for (const char c : piece) text[size++] = c;
-  }
 };
 
 namespace format {
@@ -82,7 +54,8 @@ constexpr Conversion parseConversion(const char *text, std::size_t begin) {
       break;
   }
   for (; text[at] >= '0' && text[at] <= '9'; ++at) c.width = c.width * 10 + static_cast<unsigned>(text[at] - '0');
-  if (text[at] == '.') {
+  const bool hasPrecision = text[at] == '.';
+  if (hasPrecision) {
     c.precision = static_cast<unsigned>(text[at + 1] - '0');
     at += 2;
   }
@@ -98,6 +71,7 @@ constexpr Conversion parseConversion(const char *text, std::size_t begin) {
   if (hex && c.width != 0 && !c.zeros) throw "a width of hexadecimal digits wants leading zeros";
   if ((c.blank || c.left) && c.kind != 'f') throw "the blank flag and left alignment are for floats";
   if (c.longLong && !integer) throw "ll is for integers";
+  if (hasPrecision && c.kind != 'f') throw "a precision is for floats";
   if (c.kind == 'f' && c.precision != 3 && c.precision != 6) throw "floats have 3 or 6 decimals";
   return c;
 }
@@ -125,13 +99,6 @@ template <class T>
 T plain(const LittleEndian<T> &field) {
   return field;
 }
-
-template <class T>
-inline constexpr bool kIsBlock = false;
-template <std::size_t Width>
-inline constexpr bool kIsBlock<Label<Width>> = true;
-template <std::size_t Block>
-inline constexpr bool kIsBlock<TextBlock<Block>> = true;
 
 template <Conversion C, class T>
 std::size_t room(const T &argument) noexcept {
@@ -188,7 +155,7 @@ char *writeInteger(char *out, T value) noexcept {
   const auto bits = static_cast<Unsigned>(value);
   const bool negative = C.kind == 'i' && static_cast<std::make_signed_t<Unsigned>>(bits) < 0;
   const Unsigned magnitude = negative ? Unsigned{0} - bits : bits;
-  if constexpr (C.kind == 'x' && C.width == 8) {
+  if constexpr (C.kind == 'x' && C.width == 8 && !C.longLong) {
     return writeHex8(out, bits);
   } else if constexpr (C.kind == 'x' || C.kind == 'X') {
     return writeHex(out, bits, C.width == 0 ? 1 : C.width, C.kind == 'X');

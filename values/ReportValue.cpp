@@ -2,9 +2,12 @@
 #include "values/ReportValue.h"
 
 #include <bit>
+#include <charconv>
 #include <memory>
 #include <ostream>
 #include <stdexcept>
+
+#include "values/PrintfFormat.h"
 
 namespace vesk {
 
@@ -57,19 +60,40 @@ constexpr const char *typeName() {
     return "i64";
   else if constexpr (std::is_same_v<T, float>)
     return "float";
-  else if constexpr (std::is_same_v<T, double>)
-    return "double";
   else
-    return "bool";
+    return "double";
+}
+
+/// With as many digits as tell it from every other number of its type.
+template <class T>
+void printNumber(std::ostream &out, T value) {
+  char text[32];
+  out.write(text, std::to_chars(text, text + sizeof(text), value).ptr - text);
+}
+
+void printText(std::ostream &out, std::string_view text) {
+  out << '"';
+  for (const char c : text) {
+    if (c == '"' || c == '\\')
+      out << '\\' << c;
+    else if (static_cast<unsigned char>(c) >= 0x20 && c != 0x7F)
+      out << c;
+    else
+      out << "\\x" << formatted<"%02x">(std::uint32_t{static_cast<unsigned char>(c)});
+  }
+  out << '"';
 }
 
 template <class T>
 void print(std::ostream &out, const T &value) {
   if constexpr (std::is_same_v<T, std::string>) {
-    out << '"' << value << '"';
+    printText(out, value);
   } else if constexpr (kIsArray<T>) {
     out << typeName<typename T::value_type>() << '[';
-    for (std::size_t i = 0; i < value.size(); ++i) out << (i == 0 ? "" : ", ") << value[i];
+    for (std::size_t i = 0; i < value.size(); ++i) {
+      out << (i == 0 ? "" : ", ");
+      printNumber(out, value[i]);
+    }
     out << ']';
   } else if constexpr (std::is_same_v<T, Dictionary>) {
     const char *separator = "{";
@@ -81,7 +105,8 @@ void print(std::ostream &out, const T &value) {
   } else if constexpr (std::is_same_v<T, bool>) {
     out << (value ? "true" : "false");
   } else {
-    out << typeName<T>() << ' ' << +value;
+    out << typeName<T>() << ' ';
+    printNumber(out, value);
   }
 }
 
@@ -93,11 +118,9 @@ Dictionary::Dictionary(std::size_t entries, std::size_t nestedEntries)
       room_(static_cast<std::uint32_t>(nestedEntries)),
       owns_(true) {}
 
-Dictionary::Dictionary(InRoomOf room, std::size_t entries) {
-  Dictionary &outer = room.outer;
+void Dictionary::takeRoomOf(Dictionary &outer, std::size_t entries) {
   if (entries > outer.room_) {
-    Dictionary own(entries);
-    steal(own);
+    *this = Dictionary(entries);
     return;
   }
   outer.room_ -= static_cast<std::uint32_t>(entries);
@@ -105,18 +128,11 @@ Dictionary::Dictionary(InRoomOf room, std::size_t entries) {
   capacity_ = static_cast<std::uint32_t>(entries);
 }
 
-Dictionary::Dictionary(Dictionary &&other) {
-  if (other.owns_) {
-    steal(other);
-    return;
-  }
-  Dictionary own(other.size_);
-  for (Entry *entry = other.entries_; entry != other.entries_ + other.size_; ++entry)
-    own.add(entry->key, std::move(entry->value));
-  steal(own);
+Dictionary::Dictionary(Dictionary &&other) noexcept {
+  steal(other);
 }
 
-Dictionary &Dictionary::operator=(Dictionary &&other) {
+Dictionary &Dictionary::operator=(Dictionary &&other) noexcept {
   Dictionary taken(std::move(other));
   release();
   steal(taken);
@@ -144,9 +160,10 @@ void Dictionary::throwFull() {
   throw std::length_error("vesk::Dictionary: more entries than it was given room for");
 }
 
-Dictionary &Dictionary::addDictionary(Key key, std::size_t entries) {
-  Entry &entry = emplace(key, std::in_place_type<Dictionary>, InRoomOf{*this}, entries);
-  return entry.value.nested();
+EntryAdder Dictionary::addDictionary(Key key, std::size_t entries) {
+  Dictionary &nested = emplace(key, std::in_place_type<Dictionary>, Dictionary()).value.nested();
+  nested.takeRoomOf(*this, entries);
+  return nested;
 }
 
 const ReportValue *Dictionary::find(std::string_view key) const noexcept {

@@ -33,26 +33,27 @@ class Key {
 };
 
 struct Entry;
+class EntryAdder;
 
 /// String keys to values, in the order in which they were added. Each key is added once.
 ///
 /// Its entries lie in one block of fixed size. A dictionary that is going to hold dictionaries is given room for their
-/// entries too, behind its own, so that a whole tree is one allocation; nested dictionaries can then not be moved out
-/// without being copied, which the move constructor does.
+/// entries too, behind its own, so that a whole tree is one allocation: one for each of the 239 small dictionaries of
+/// the black box configuration took three times as long.
 class Dictionary {
  public:
   Dictionary() noexcept = default;
   /// Room for `entries` entries, and for `nestedEntries` more that addDictionary() deals out.
   explicit Dictionary(std::size_t entries, std::size_t nestedEntries = 0);
-  Dictionary(Dictionary &&other);
-  Dictionary &operator=(Dictionary &&other);
+  Dictionary(Dictionary &&other) noexcept;
+  Dictionary &operator=(Dictionary &&other) noexcept;
   ~Dictionary();
 
-  /// Adds a value of exactly one of ReportValue's types; std::length_error when the room is used up.
+  /// Adds a value, a ReportValue or exactly one of its types; std::length_error when the room is used up.
   template <class T>
   void add(Key key, T value);
-  /// Adds an empty dictionary with room for `entries` and returns it; the reference lives as long as this dictionary.
-  Dictionary &addDictionary(Key key, std::size_t entries);
+  /// Adds an empty dictionary with room for `entries`. What it returns is good as long as this dictionary is.
+  EntryAdder addDictionary(Key key, std::size_t entries);
 
   std::size_t size() const noexcept { return size_; }
   const Entry *begin() const noexcept { return entries_; }
@@ -62,17 +63,10 @@ class Dictionary {
   Dictionary clone() const;
 
  private:
-  struct InRoomOf {
-    Dictionary &outer;
-  };
-
- public:
-  /// For addDictionary() alone: nobody else can name the type.
-  Dictionary(InRoomOf outer, std::size_t entries);
-
- private:
+  friend class ::ReportValue;
   template <class... Args>
   Entry &emplace(Key key, Args &&...args);
+  void takeRoomOf(Dictionary &outer, std::size_t entries);
   void steal(Dictionary &other) noexcept;
   void release() noexcept;
   [[noreturn]] static void throwFull();
@@ -82,6 +76,20 @@ class Dictionary {
   std::uint32_t capacity_ = 0;
   std::uint32_t room_ = 0;  // entries behind entries_ + capacity_ that are still to be dealt out
   bool owns_ = false;       // false: the block belongs to an outer dictionary
+};
+
+/// Fills a dictionary. A nested one is handed out as this alone, because it must not be moved away from the block that
+/// it lies in.
+class EntryAdder {
+ public:
+  EntryAdder(Dictionary &dictionary) : dictionary_(dictionary) {}  // NOLINT: implicit
+
+  template <class T>
+  void add(Key key, T value);
+  EntryAdder addDictionary(Key key, std::size_t entries) { return dictionary_.addDictionary(key, entries); }
+
+ private:
+  Dictionary &dictionary_;
 };
 
 template <class T, class Variant>
@@ -101,9 +109,6 @@ class ReportValue {
   template <class T>
   requires vesk::kIsAlternative<T, Variant>
   explicit ReportValue(T value) : variant_(std::in_place_type<T>, std::move(value)) {}
-  /// Makes the alternative T in place.
-  template <class T, class... Args>
-  explicit ReportValue(std::in_place_type_t<T> type, Args &&...args) : variant_(type, std::forward<Args>(args)...) {}
 
   ReportValue clone() const;
 
@@ -135,7 +140,9 @@ class ReportValue {
   friend std::ostream &operator<<(std::ostream &out, const ReportValue &value);
 
  private:
-  friend class vesk::Dictionary;  // fills the dictionary that it has just added
+  friend class vesk::Dictionary;  // makes its values in place, and fills the dictionary that it has just added
+  template <class T>
+  ReportValue(std::in_place_type_t<T> type, T &&value) : variant_(type, std::move(value)) {}
   vesk::Dictionary &nested() { return std::get<vesk::Dictionary>(variant_); }
 
   Variant variant_;
@@ -183,10 +190,16 @@ Entry &Dictionary::emplace(Key key, Args &&...args) {
 
 template <class T>
 void Dictionary::add(Key key, T value) {
+  static_assert(std::is_same_v<T, ReportValue> || kIsAlternative<T, ReportValue::Variant>, "say the width");
   if constexpr (std::is_same_v<T, ReportValue>)
     emplace(key, std::move(value));
   else
     emplace(key, std::in_place_type<T>, std::move(value));
+}
+
+template <class T>
+void EntryAdder::add(Key key, T value) {
+  dictionary_.add(key, std::move(value));
 }
 
 }  // namespace vesk

@@ -340,7 +340,20 @@ constexpr std::array<Module, kModules> kCatalogue = kByIndex;
 
 }  // namespace vesk
 
-const char *const blob_names[10] = {
+constexpr const char *const blob_names[10] = {
     "BLOB_LAFE", "BLOB_LFCL", "BLOB_LPMp", "BLOB_LSPR", "BLOB_LSSp",
     "BLOB_LSSC", "BLOB_LSRx", "BLOB_LSPM", "BLOB_LRTC", "BLOB_LSFN",
 };
+
+namespace vesk {
+namespace {
+
+consteval bool blobNamesAgree() {
+  for (std::size_t j = 0; j < kBlobOrder.size(); ++j)
+    if (kByIndex[kBlobOrder[j]].name.text() != blob_names[j]) return false;
+  return true;
+}
+static_assert(blobNamesAgree());
+
+}  // namespace
+}  // namespace vesk

@@ -55,8 +55,8 @@ constexpr std::size_t kEntries = [] {
 
 constexpr std::size_t kDoubleOpen = 3, kSingleOpen = 4;
 
-/// On screen, OPEN_SHORT_EVENT_SINGLE_OPEN has always shown the byte of OPEN_SHORT_EVENT_DOUBLE_OPEN, and whoever reads
-/// these screens counts on it; a dictionary holds the event's own byte.
+/// On screen, OPEN_SHORT_EVENT_SINGLE_OPEN shows the byte of OPEN_SHORT_EVENT_DOUBLE_OPEN: the panel test sets both
+/// alike and its screens are compared by line. A dictionary holds the event's own byte.
 std::size_t shownEvent(ModuleIndex module, std::size_t event) {
   return module == kOpenShortTest && event == kSingleOpen ? kDoubleOpen : event;
 }

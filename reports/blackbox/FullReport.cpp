@@ -77,11 +77,11 @@ DisplayLines toLines(const Layout &r) {
 
 void addBlock(Dictionary &out, const Layout &r, ModuleIndex index) {
   const Module &module = kCatalogue[index];
-  Dictionary &block = out.addDictionary(module.name, 2 + module.events.size());
+  EntryAdder block = out.addDictionary(module.name, 2 + module.events.size());
   const BlockHead head = r.head(index);
   block.add(module.idKey, u16(head.moduleId));
   if (index != kPmgr)
-    block.add(module.countKey, u16(head.eventCount));  // consumers know PMGR's as one event, uncounted
+    block.add(module.countKey, u16(head.eventCount));  // PMGR's dictionary has no event count; its lines have one
   for (std::size_t e = 0; e < module.events.size(); ++e) block.add(module.events[e].key, u32(r.counter(index, e)));
 }
 

@@ -38,7 +38,7 @@ consteval std::array<OptionText, 256> optionTexts(bool withLevel) {
 constexpr std::array<OptionText, 256> kOptionWithLevel = optionTexts(true);
 constexpr std::array<OptionText, 256> kOptionWithoutLevel = optionTexts(false);
 
-void addOption(Dictionary &out, std::uint8_t option) {
+void addOption(EntryAdder out, std::uint8_t option) {
   out.add("ERROR_LEVEL", std::string(levelName(option & kLevelMask)));
   out.add("OPTIONS_RAW", i32(option));  // whole: a consumer takes the flags out of it
 }

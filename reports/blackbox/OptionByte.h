@@ -26,6 +26,6 @@ extern const std::array<OptionText, 256> kOptionWithLevel;
 extern const std::array<OptionText, 256> kOptionWithoutLevel;
 
 /// Fills a dictionary that has room for two entries.
-void addOption(Dictionary &out, std::uint8_t option);
+void addOption(EntryAdder out, std::uint8_t option);
 
 }  // namespace vesk

@@ -1,5 +1,6 @@
 // ADC dump reports: one packet of captured words (input 0x77), the capture's configuration (feature 0xDC) and its state
 // (feature 0xDE).
+#include <array>
 #include <cstddef>
 
 #include "plugin/HIDReportVeskPlugin.h"

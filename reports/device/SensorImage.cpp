@@ -1,4 +1,5 @@
 // Sensor image, input 0x76: one frame of samples of both scans, and the temperature.
+#include <array>
 #include <cstddef>
 
 #include "plugin/HIDReportVeskPlugin.h"

@@ -24,7 +24,7 @@ std::optional<std::string_view> versionText(const char *report) {
   throw std::invalid_argument("HIDReportVeskPlugin: the version text is not UTF-8");
 }
 
-/// Cuts the first line off `rest`, which becomes empty-handed (nothing) behind the last line.
+/// Cuts the first line off `rest`, which becomes nothing behind the last line.
 std::string_view takeLine(std::optional<std::string_view> &rest) {
   const std::size_t lineFeed = rest->find('\n');
   const std::string_view line = rest->substr(0, lineFeed);

@@ -37,6 +37,13 @@ TEST(PaddedReport, ReuseLeavesNothingBehind) {
   }
 }
 
+TEST(PaddedReport, KeepsThePromiseWhenItIsMovedFrom) {
+  PaddedReport report("\xE0\x0D");
+  const PaddedReport taken(std::move(report));
+  expectHolds(taken, "\xE0\x0D");
+  expectHolds(report, "\xE0\x0D");  // NOLINT: that is what is tested
+}
+
 TEST(PaddedReport, TakesACopy) {
   std::string bytes = "abc";
   const PaddedReport report(bytes);

@@ -26,6 +26,20 @@ TEST(PluginError, ControlCharactersOfTheMessageStayOffTheTerminal) {
   EXPECT_THAT(error.description(), HasSubstr("\xC3\xA4"));
 }
 
+TEST(PluginError, CharactersThatOtherEncodingsCallControlAreWrittenOutByteByByte) {
+  const auto shown = [](const char *message) {
+    return PluginError{"D", 1, {{PluginError::kLocalizedDescription, message}}}.description();
+  };
+  EXPECT_THAT(shown("a\xC2\x80"  // U+0080
+                    "b"),
+              HasSubstr("a\\xc2\\x80b"));
+  EXPECT_THAT(shown("\xC2\x9F"), HasSubstr("\\xc2\\x9f"));
+  EXPECT_THAT(shown("\xC2\xA0"), HasSubstr("\xC2\xA0"));  // a blank that does not break
+  EXPECT_THAT(shown("\xE2\x80\xA8\xE2\x80\xA9"), HasSubstr("\\xe2\\x80\\xa8\\xe2\\x80\\xa9"));
+  EXPECT_THAT(shown("\xE2\x80\xAA"), HasSubstr("\xE2\x80\xAA"));
+  EXPECT_THAT(shown("\xC2"), HasSubstr("\xC2"));  // cut off: nothing is read behind the end
+}
+
 TEST(PluginError, WithoutAMessage) {
   EXPECT_EQ(PluginError().localizedDescription(), "");
   EXPECT_THAT((PluginError{"D", 7, {}}).description(), HasSubstr("7"));

@@ -13,6 +13,7 @@ namespace {
 
 using testing::ElementsAre;
 using vesk::Dictionary;
+using vesk::EntryAdder;
 using vesk::u16;
 using vesk::u32;
 using vesk::u8;
@@ -160,11 +161,11 @@ ReportValue nested() {
   Dictionary outer(4, 4);
   outer.add("N", u16(3));
   for (int i = 0; i < 2; ++i) {
-    Dictionary &inner = i == 0 ? outer.addDictionary("P", 2) : outer.addDictionary("Q", 2);
+    EntryAdder inner = i == 0 ? outer.addDictionary("P", 2) : outer.addDictionary("Q", 2);
     inner.add("A", u32(static_cast<std::uint32_t>(i)));
     inner.add("T", std::string(40, static_cast<char>('a' + i)));
   }
-  Dictionary &own = outer.addDictionary("R", 1);
+  EntryAdder own = outer.addDictionary("R", 1);
   own.add("A", std::vector<float>{1, 2, 3});
   return ReportValue(std::move(outer));
 }
@@ -181,28 +182,31 @@ TEST(Dictionary, NestedDictionariesFillTheOuterRoomAndThenTheirOwn) {
 
 TEST(Dictionary, NestedDictionaryIsFullToo) {
   Dictionary outer(2, 4);
-  Dictionary &inner = outer.addDictionary("P", 1);
+  EntryAdder inner = outer.addDictionary("P", 1);
   inner.add("A", u8(1));
   EXPECT_THROW(inner.add("B", u8(2)), std::length_error);
-  Dictionary &next = outer.addDictionary("Q", 3);
+  EntryAdder next = outer.addDictionary("Q", 3);
   next.add("A", u8(2));
-  EXPECT_EQ(inner.find("A")->as<std::uint8_t>(), 1);
+  EXPECT_EQ(outer.find("P")->at("A").as<std::uint8_t>(), 1);
 }
 
-TEST(Dictionary, NestedDictionaryOutlivesItsParentWhenMovedOut) {
+// A nested dictionary lies in its parent's block, so nobody is handed one that could be moved out of it.
+static_assert(!std::is_convertible_v<EntryAdder, Dictionary> && !std::is_constructible_v<Dictionary, EntryAdder>);
+static_assert(std::is_nothrow_move_constructible_v<ReportValue> && std::is_nothrow_move_assignable_v<ReportValue>);
+
+TEST(Dictionary, NestedDictionariesMoveWithTheirTree) {
+  Dictionary outer(1, 3);
+  EntryAdder inner = outer.addDictionary("P", 3);
+  inner.add("A", u32(7));
+  inner.add("B", std::string(100, 'b'));
+  inner.addDictionary("C", 0);
   ReportValue taken(u8(0));
-  {
-    Dictionary outer(1, 3);
-    Dictionary &inner = outer.addDictionary("P", 3);
-    inner.add("A", u32(7));
-    inner.add("B", std::string(100, 'b'));
-    inner.addDictionary("C", 0);
-    taken = ReportValue(std::move(inner));
-  }
-  EXPECT_THAT(keys(taken.as<Dictionary>()), ElementsAre("A", "B", "C"));
-  EXPECT_EQ(taken.at("A").as<std::uint32_t>(), 7u);
-  EXPECT_EQ(taken.at("B").as<std::string>(), std::string(100, 'b'));
-  EXPECT_EQ(taken.at("C").size(), 0u);
+  taken = ReportValue(std::move(outer));
+  EXPECT_EQ(outer.size(), 0u);
+  EXPECT_THAT(keys(taken.at("P").as<Dictionary>()), ElementsAre("A", "B", "C"));
+  EXPECT_EQ(taken.at("P").at("A").as<std::uint32_t>(), 7u);
+  EXPECT_EQ(taken.at("P").at("B").as<std::string>(), std::string(100, 'b'));
+  EXPECT_EQ(taken.at("P").at("C").size(), 0u);
 }
 
 TEST(Dictionary, MovesOfTheWholeTree) {
