@@ -23,10 +23,10 @@ struct Options {
 };
 
 /// Which report is being waited for, on a terminal: one that stays mute takes seconds.
-class Progress {
+class WaitingLine {
  public:
-  Progress(bool quiet, std::size_t total) : shows_(!quiet && ::isatty(STDERR_FILENO) == 1), total_(total) {}
-  ~Progress() { clear(); }
+  WaitingLine(bool quiet, std::size_t total) : shows_(!quiet && ::isatty(STDERR_FILENO) == 1), total_(total) {}
+  ~WaitingLine() { clear(); }
 
   void show(std::size_t done, std::uint32_t id) const {
     if (!shows_) return;
@@ -47,13 +47,13 @@ void readReports(HidNode &node, const std::vector<std::uint32_t> &ids, milliseco
                  bool quiet, DeviceOutput &output) {
   using Clock = std::chrono::steady_clock;
   const auto begin = Clock::now();
-  const Progress progress(quiet, ids.size());
+  const WaitingLine waiting(quiet, ids.size());
   FeatureReader reader(node, timeout, stop);
   std::size_t asked = 0;
   for (; asked < ids.size() && !stop.requested(); ++asked) {
-    progress.show(asked, ids[asked]);
+    waiting.show(asked, ids[asked]);
     const FeatureReader::Answer answer = reader.get(ids[asked]);
-    progress.clear();
+    waiting.clear();
     if (answer.stopped) break;
     if (answer.gone) {
       output.message({&kDeviceGone, output.node(), {}, ids[asked], "the device has gone"});
