@@ -36,7 +36,8 @@ steps() {
   step scripts 1
   step tests 45
   step clang 20
-  step tidy 20
+  step tidy 25
+  step fuzz 15 tools/fuzz.sh 30
 }
 
 wanted=("$@") done=0 passed=0 failed=0
