@@ -66,6 +66,7 @@ const Decoded &Decoder::decode(const SourceReport &report) {
   decoded_.lines.reset();
   decoded_.value.reset();
   decoded_.findings.clear();
+  if (!options_.value && !options_.lines) return decoded_;  // an output form that passes the reports on as they are
   padded_.assign(report.bytes);
   judgeLength(report);
 
@@ -80,8 +81,7 @@ const Decoded &Decoder::decode(const SourceReport &report) {
   const bool nothing = !decoded_.value && !decoded_.lines;
   bool said = false;
   for (const Finding &finding : decoded_.findings) said = said || finding.severity == Severity::kError;
-  if (nothing && !said && (options_.value || options_.lines))
-    find(kNothingDecoded, "the decoder gave nothing: the text is not UTF-8");
+  if (nothing && !said) find(kNothingDecoded, "the decoder gave nothing: the text is not UTF-8");
   return decoded_;
 }
 
