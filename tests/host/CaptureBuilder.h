@@ -185,7 +185,7 @@ inline Bytes capture(const std::vector<Event> &events, const Form &form = {}) {
 }
 
 /// A report as it was handed over, with bytes of its own.
-struct Found {
+struct HandedOver {
   Bytes bytes;
   std::uint32_t id = 0;
   vesk::host::ReportType type{};
@@ -197,7 +197,7 @@ struct Found {
 };
 
 struct Outcome : vesk::host::ReadSink {
-  std::vector<Found> reports;
+  std::vector<HandedOver> reports;
   std::vector<vesk::host::Message> messages;
 
   void report(const vesk::host::SourceReport &given) override {
@@ -226,7 +226,7 @@ struct Outcome : vesk::host::ReadSink {
   }
   std::vector<Bytes> bytes() const {
     std::vector<Bytes> found;
-    for (const Found &found_ : reports) found.push_back(found_.bytes);
+    for (const HandedOver &found_ : reports) found.push_back(found_.bytes);
     return found;
   }
 };

@@ -42,7 +42,7 @@ dc451e184700000047000000010000008188ffff4302800701002d0000f15365
 
 void expectTheSummary(const Outcome &outcome) {
   ASSERT_EQ(outcome.reports.size(), 1u);
-  const Found &report = outcome.reports[0];
+  const HandedOver &report = outcome.reports[0];
   EXPECT_EQ(report.bytes, kSummary);
   EXPECT_EQ(report.id, 0xE0u);
   EXPECT_EQ(report.type, ReportType::kFeature);
