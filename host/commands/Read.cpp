@@ -8,6 +8,7 @@
 #include "host/device/FeatureReader.h"
 #include "host/device/Hidraw.h"
 #include "host/device/OpenDevice.h"
+#include "host/diagnostics/Progress.h"
 #include "host/report/KnownReports.h"
 #include "values/PrintfFormat.h"
 
@@ -31,11 +32,11 @@ class WaitingLine {
   void show(std::size_t done, std::uint32_t id) const {
     if (!shows_) return;
     const KnownReport *known = findReport(id);
-    std::fprintf(stderr, "\r\x1b[Kreading 0x%02X %.*s (%zu of %zu)", id, static_cast<int>(known->name.size()),
-                 known->name.data(), done + 1, total_);
+    std::fprintf(stderr, "%sreading 0x%02X %s (%zu of %zu)", kClearLine.data(), id, known->name.data(), done + 1,
+                 total_);
   }
   void clear() const {
-    if (shows_) std::fputs("\r\x1b[K", stderr);
+    if (shows_) std::fputs(kClearLine.data(), stderr);
   }
 
  private:
@@ -108,6 +109,7 @@ void addRead(CLI::App &app, CommandContext &context) {
   options->device.addDevice(*command);
   options->device.addTimeout(*command);
   options->output.addTo(*command);
+  command->remove_option(command->get_option("--jobs"));  // there is nothing to share
   command->callback([options, &context] { run(*options, context); });
 }
 

@@ -165,6 +165,9 @@ void addWatch(CLI::App &app, CommandContext &context) {
       ->capture_default_str();
   addCommon(*command, *options);
   options->output.addTo(*command);
+  command->get_option("--output-file")
+      ->description("write to FILE, which is whole at any moment; - is standard output");
+  command->remove_option(command->get_option("--jobs"));  // there is nothing to share
   command->callback([options, &context] {
     if (options->output.form == "json")
       throw CLI::ValidationError("--output", "a JSON document has an end, which a stream has not; use jsonl");

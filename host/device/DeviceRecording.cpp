@@ -27,6 +27,9 @@ std::string timeText(std::time_t time) {
 
 class DeviceRecordingFormatter : public Formatter {
  public:
+  /// Not to be written, but what does not decode is to be told while the device is still there.
+  bool wantsValue() const override { return true; }
+
   void report(OutputBuffer &out, const SourceReport &report, const Decoded &, bool, std::vector<Finding> &) override {
     appendRecordingLine(out, report.type, roundedMicroseconds(report.timeNs.value_or(0)), report.bytes);
   }

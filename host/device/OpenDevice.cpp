@@ -117,9 +117,8 @@ std::unique_ptr<HidNode> openDevice(HidSystem &system, const std::string &name, 
       continue;
     }
     if (isDenied) throw denied(system, node, opened.error);
-    const char *reason = opened.error == ENOTTY || opened.error == EINVAL
-                             ? "it is no HID device node, which was expected"
-                             : std::strerror(opened.error);
+    const char *reason =
+        opened.error == ENOTTY || opened.error == EINVAL ? "not a HID device node" : std::strerror(opened.error);
     throw DeviceError({&kDeviceUnopened, node, {}, {}, std::string("cannot be opened: ") + reason});
   }
 }

@@ -182,7 +182,7 @@ TEST(OpenDevice, namesModeOwnerAndRuleWhereRightsAreMissing) {
 
 TEST(OpenDevice, sayWhatOtherFailuresAre) {
   const Stop stop;
-  for (const auto &[error, words] : {std::pair(ENODEV, "No such device"), std::pair(ENOTTY, "no HID device node")}) {
+  for (const auto &[error, words] : {std::pair(ENODEV, "No such device"), std::pair(ENOTTY, "not a HID device node")}) {
     FakeSystem system;
     system.onOpen = [error = error](const std::string &) { return HidSystem::Opened{nullptr, error}; };
     const Message message = errorOf([&] { openDevice(system, "/dev/x", stop); });

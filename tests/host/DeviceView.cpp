@@ -43,16 +43,22 @@ ViewState small() {
 }
 
 TEST(View, showsNumbersAndBars) {
-  EXPECT_THAT(linesOf(small()), ElementsAre("/dev/hidraw0  Vesk",                          //
-                                            "frame 12345   59.9/s   36.50 degC   3 lost",  //
-                                            "D-SCAN I, +-5",                               //
-                                            "  ▄    ",                                     //
-                                            "  ██   ",                                     //
-                                            "     ▀█",                                     //
-                                            "      ▀",                                     //
-                                            "D-SCAN Q, +-1",                               //
-                                            "       ", "       ", "       ", "       ",    //
-                                            "  0"));
+  std::string picture;
+  for (const std::string &line : linesOf(small())) picture += line + "\n";
+  EXPECT_EQ(picture,
+            "/dev/hidraw0  Vesk\n"
+            "frame 12345   59.9/s   36.50 degC   3 lost\n"
+            "D-SCAN I, +-5\n"
+            "  ▄    \n"
+            "  ██   \n"
+            "     ▀█\n"
+            "      ▀\n"
+            "D-SCAN Q, +-1\n"
+            "       \n"
+            "       \n"
+            "       \n"
+            "       \n"
+            "  0\n");
 }
 
 TEST(View, anOddNumberOfLinesHasItsZeroInTheMiddleOfOne) {

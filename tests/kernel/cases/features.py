@@ -110,8 +110,7 @@ class Features(bench.Case):
         self.assertEqual(self.step("no-such").code, 3)
         self.assertIn("error: no device is called NOSUCH; there are:", self.step("no-such").err.decode())
         self.ended("no-path", 3, "/dev/hidraw77: error: cannot be opened: No such file or directory")
-        self.ended("no-node", 3,
-                   "/dev/null: error: cannot be opened: it is no HID device node, which was expected")  # fmt: skip
+        self.ended("no-node", 3, "/dev/null: error: cannot be opened: not a HID device node")
 
     # --- all is well
 
@@ -200,7 +199,10 @@ class Features(bench.Case):
         self.assertEqual(self.step("fault-json").code, 4)
 
     def test_a_report_that_fails_is_data_in_a_snapshot(self):
-        self.assertEqual(self.step("fault-snapshot").code, 4)
+        step = self.step("fault-snapshot")
+        self.assertEqual(step.code, 4)
+        told = re.findall(r"^/dev/hidraw1: error: 0x(..): ", step.err.decode(), re.MULTILINE)
+        self.assertEqual(told, ["DF", "E0", "E1", "E2", "E3"])
         lines = recorded("faults.hid")
         self.assertEqual([line for line in lines if line.startswith("# F ")], [
             "# F 0xDF error request-timeout: no answer within 0.5 s",

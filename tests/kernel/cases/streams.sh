@@ -101,6 +101,7 @@ background pipe -- sh -c '{ vesk-report watch; echo $? >/out/pipe.code; } | head
 waitOpen plain
 tell plain 'stream 50 50 76'
 finish pipe
+waitLog plain 'streamed 50 '
 background full -- vesk-report watch -O /dev/full
 waitOpen plain
 tell plain 'send 76'
