@@ -12,7 +12,7 @@ if [[ ! $seconds =~ ^[1-9][0-9]*$ ]]; then
 fi
 if [[ $# -gt 0 ]]; then shift; fi
 
-tools/build fuzz
+tools/build fuzz fuzz/all
 targets=("$@")
 if [[ $# == 0 ]]; then mapfile -t targets < <(basename -s .cpp fuzz/Fuzz*.cpp); fi
 

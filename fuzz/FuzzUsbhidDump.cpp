@@ -1,0 +1,6 @@
+// usbhid-dump text, whose reports come in pieces.
+#include "fuzz/ReadInput.h"
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size) {
+  return fuzz::readInput("usbhid-dump", data, size);
+}

@@ -1,0 +1,6 @@
+// usbmon text.
+#include "fuzz/ReadInput.h"
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size) {
+  return fuzz::readInput("usbmon-text", data, size);
+}
