@@ -1,10 +1,12 @@
 // vesk-report: decodes the Vesk controller's reports from recordings and live devices.
+#include <fcntl.h>
 #include <unistd.h>
 
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <exception>
+#include <sstream>
 
 #include "host/commands/Command.h"
 #include "host/output/OutputFile.h"
@@ -30,6 +32,22 @@ std::vector<std::string> takeArguments(int argc, char **argv) {
     if (argument == "-decimal") argument = "--decimal";
   }
   return arguments;
+}
+
+/// Whoever started us may have closed standard input, output or error. The next file that is opened must not be taken
+/// for one of them; what stands there instead fails when it is used.
+void occupyStandardDescriptors() {
+  for (const int fd : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
+    if (::fcntl(fd, F_GETFD) == -1) ::open("/dev/null", fd == STDIN_FILENO ? O_WRONLY : O_RDONLY);
+}
+
+/// Prints what was asked for (help, the version) or what is wrong with the command line.
+ExitCode answer(const CLI::App &app, const CLI::ParseError &error) {
+  std::ostringstream out, problem;
+  const bool good = app.exit(error, out, problem) == 0;
+  std::fputs(problem.str().c_str(), stderr);
+  OutputFile("-").write(out.str());
+  return good ? kExitOk : kExitUsage;
 }
 
 int runProgram(int argc, char **argv) {
@@ -61,7 +79,7 @@ int runProgram(int argc, char **argv) {
     std::reverse(arguments.begin(), arguments.end());  // CLI11 takes them from the back
     app.parse(std::move(arguments));
   } catch (const CLI::ParseError &error) {
-    return app.exit(error) == 0 ? kExitOk : kExitUsage;
+    return answer(app, error);
   }
   return context.exitCode;
 }
@@ -69,6 +87,7 @@ int runProgram(int argc, char **argv) {
 }  // namespace
 
 int main(int argc, char **argv) {
+  occupyStandardDescriptors();
   std::signal(SIGPIPE, SIG_IGN);
   try {
     return runProgram(argc, argv);

@@ -1,6 +1,8 @@
 // The queue between the reading thread and the decoding ones, and the delivery in order.
 #include "host/decode/Workers.h"
 
+#include <system_error>
+
 namespace vesk::host {
 
 namespace {
@@ -13,7 +15,15 @@ constexpr unsigned kBatchesEach = 3;
 Workers::Workers(unsigned count, const MakePrinter &makePrinter, Deliver deliver) : deliver_(std::move(deliver)) {
   for (unsigned i = 0; i < count * kBatchesEach + 1; ++i) spare_.push_back(std::make_unique<Batch>());
   for (unsigned i = 0; i < count; ++i) printers_.push_back(makePrinter());
-  for (const auto &printer : printers_) threads_.emplace_back([this, &printer] { work(*printer); });
+  threads_.reserve(count);
+  for (const auto &printer : printers_) {
+    try {
+      threads_.emplace_back([this, &printer] { work(*printer); });
+    } catch (const std::system_error &) {
+      if (threads_.empty()) throw;
+      break;  // the machine has no more to give; those that run do all the work
+    }
+  }
 }
 
 Workers::~Workers() {

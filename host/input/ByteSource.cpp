@@ -107,7 +107,8 @@ std::unique_ptr<ByteSource> ByteSource::open(const std::string &path, Watch watc
   const std::string name = standardInput ? "(standard input)" : path;
   int fd = STDIN_FILENO;
   if (!standardInput) {
-    fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+    do fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+    while (fd < 0 && errno == EINTR);
     if (fd < 0) throw InputError(std::strerror(errno));
   }
   auto source = std::make_unique<ByteSource>(name, std::make_unique<FileBytes>(fd, std::move(watch)));

@@ -1,0 +1,150 @@
+// Preloaded into the program under test: the n-th call of one system call fails, or does only part of its work.
+//
+// VESK_FAULT says which: "write 3 ENOSPC" (by number: "write 3 28"), "read 2 short", "write all short", or "count
+// FILE", which lets all succeed and writes "read 17" and so on into FILE at the end. Only the program's own calls are
+// seen, not those that the C library makes for itself.
+#include <dlfcn.h>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/types.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <cerrno>
+#include <cstdarg>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+
+namespace {
+
+enum Call { kOpen, kRead, kWrite, kClose, kRename, kFsync, kMkostemp, kStat, kIoctl, kCalls };
+constexpr const char *kNames[kCalls] = {"open",  "read",     "write", "close", "rename",
+                                        "fsync", "mkostemp", "stat",  "ioctl"};
+
+struct Fault {
+  int call = -1;
+  long number = 0;  // counted from 1; 0 for all
+  int error = 0;    // 0: does part of its work
+  char countFile[256] = {};
+
+  Fault() {
+    const char *text = std::getenv("VESK_FAULT");
+    if (text == nullptr) return;
+    if (std::sscanf(text, "count %255s", countFile) == 1) return;
+    char name[16], which[16], what[16];
+    if (std::sscanf(text, "%15s %15s %15s", name, which, what) != 3) std::abort();
+    for (int c = 0; c < kCalls; ++c)
+      if (std::strcmp(name, kNames[c]) == 0) call = c;
+    if (call < 0) std::abort();
+    number = std::strcmp(which, "all") == 0 ? 0 : std::atol(which);
+    error = std::strcmp(what, "short") == 0 ? 0 : std::atoi(what);
+  }
+};
+
+std::atomic<long> counts[kCalls];
+
+const Fault &fault() {
+  static const Fault fault;
+  return fault;
+}
+
+enum class Fate { kNormal, kFails, kShort };
+
+Fate fate(Call call) {
+  const long number = ++counts[call];
+  if (fault().call != call || (fault().number != 0 && fault().number != number)) return Fate::kNormal;
+  if (fault().error == 0) return Fate::kShort;
+  errno = fault().error;
+  return Fate::kFails;
+}
+
+template <class Function>
+Function *next(const char *name) {
+  return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
+}
+
+__attribute__((destructor)) void writeCounts() {
+  if (fault().countFile[0] == '\0') return;
+  if (std::FILE *file = std::fopen(fault().countFile, "w")) {
+    for (int c = 0; c < kCalls; ++c) std::fprintf(file, "%s %ld\n", kNames[c], counts[c].load());
+    std::fclose(file);
+  }
+}
+
+int openAs(const char *name, const char *path, int flags, mode_t mode) {
+  if (fate(kOpen) == Fate::kFails) return -1;
+  return next<int(const char *, int, ...)>(name)(path, flags, mode);
+}
+
+mode_t modeOf(int flags, va_list arguments) {
+  return (flags & O_CREAT) != 0 ? va_arg(arguments, mode_t) : 0;
+}
+
+}  // namespace
+
+extern "C" {
+
+int open(const char *path, int flags, ...) {
+  va_list arguments;
+  va_start(arguments, flags);
+  const mode_t mode = modeOf(flags, arguments);
+  va_end(arguments);
+  return openAs("open", path, flags, mode);
+}
+
+int open64(const char *path, int flags, ...) {
+  va_list arguments;
+  va_start(arguments, flags);
+  const mode_t mode = modeOf(flags, arguments);
+  va_end(arguments);
+  return openAs("open64", path, flags, mode);
+}
+
+ssize_t read(int fd, void *buffer, size_t size) {
+  const Fate what = fate(kRead);
+  if (what == Fate::kFails) return -1;
+  return next<ssize_t(int, void *, size_t)>("read")(fd, buffer, what == Fate::kShort && size > 1 ? 1 : size);
+}
+
+ssize_t write(int fd, const void *buffer, size_t size) {
+  const Fate what = fate(kWrite);
+  if (what == Fate::kFails) return -1;
+  return next<ssize_t(int, const void *, size_t)>("write")(fd, buffer, what == Fate::kShort && size > 1 ? 1 : size);
+}
+
+int close(int fd) {
+  const int result = next<int(int)>("close")(fd);
+  return fate(kClose) == Fate::kFails ? -1 : result;
+}
+
+int rename(const char *from, const char *to) {
+  if (fate(kRename) == Fate::kFails) return -1;
+  return next<int(const char *, const char *)>("rename")(from, to);
+}
+
+int fsync(int fd) {
+  if (fate(kFsync) == Fate::kFails) return -1;
+  return next<int(int)>("fsync")(fd);
+}
+
+int mkostemp(char *name, int flags) {
+  if (fate(kMkostemp) == Fate::kFails) return -1;
+  return next<int(char *, int)>("mkostemp")(name, flags);
+}
+
+int mkostemp64(char *name, int flags) {
+  if (fate(kMkostemp) == Fate::kFails) return -1;
+  return next<int(char *, int)>("mkostemp64")(name, flags);
+}
+
+int ioctl(int fd, unsigned long request, ...) {
+  va_list arguments;
+  va_start(arguments, request);
+  void *argument = va_arg(arguments, void *);
+  va_end(arguments);
+  if (fate(kIoctl) == Fate::kFails) return -1;
+  return next<int(int, unsigned long, ...)>("ioctl")(fd, request, argument);
+}
+
+}  // extern "C"
