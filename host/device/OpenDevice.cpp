@@ -80,11 +80,8 @@ std::string findDevice(std::span<const DeviceIdentity> devices, const std::strin
   if (name.find('/') != std::string::npos) return name;
   std::vector<DeviceIdentity> called;
   std::ranges::copy_if(devices, std::back_inserter(called), [&](const auto &device) { return isCalled(device, name); });
-  if (called.size() > 1) {
-    const auto others =
-        std::ranges::partition(called, [](const auto &device) { return speaksOurReports(device.descriptor); });
-    if (const auto ours = std::ssize(called) - std::ssize(others); ours == 1) called.resize(1);
-  }
+  const auto speaks = [](const DeviceIdentity &device) { return speaksOurReports(device.descriptor); };
+  if (std::ranges::count_if(called, speaks) == 1) called = {*std::ranges::find_if(called, speaks)};
   if (called.size() == 1) return called.front().node;
 
   const std::string what = name.empty() ? "speaks the controller's reports" : "is called " + name;
@@ -92,7 +89,6 @@ std::string findDevice(std::span<const DeviceIdentity> devices, const std::strin
     const std::string all = devices.empty() ? "; there is no HID device here" : "; there are:" + listed(devices);
     throw DeviceError({&kNoDevice, {}, {}, {}, "no device " + what + all});
   }
-  std::ranges::sort(called, {}, [](const auto &device) { return std::pair(device.node.size(), device.node); });
   throw DeviceError({&kAmbiguousDevice,
                      {},
                      {},

@@ -49,7 +49,7 @@ StopOnSignals::StopOnSignals(Stop &stop) {
   signalled = &stop;
   struct sigaction action {};
   action.sa_handler = onSignal;
-  action.sa_flags = SA_RESETHAND;  // and no SA_RESTART
+  action.sa_flags = static_cast<int>(SA_RESETHAND);  // and no SA_RESTART
   for (std::size_t k = 0; k < std::size(kSignals); ++k) {
     ::sigaction(kSignals[k], nullptr, &before_[k]);
     // Who started us with a signal ignored, as nohup does, wants it ignored.
