@@ -33,61 +33,78 @@ inline char *writeUpToFourDigits(char *out, std::uint32_t value) noexcept {
   return out + 4 - leadingZeros;
 }
 
+/// Eight digits of a number below 100000000, leading zeros too: as the number whose lowest byte is the first character.
+inline std::uint64_t eightDigits(std::uint32_t value) noexcept {
+  std::uint32_t high, low;
+  std::memcpy(&high, kFourDigits.data()[value / 10'000].data(), 4);
+  std::memcpy(&low, kFourDigits.data()[value % 10'000].data(), 4);
+  return high | std::uint64_t{low} << 32;
+}
+
+/// How many zeros stand before the first digit; the last one is marked, so that a zero keeps it.
+inline int leadingZeros(std::uint64_t eightDigits) noexcept {
+  return std::countr_zero((eightDigits & 0x0F0F0F0F0F0F0F0Fu) | std::uint64_t{1} << 56) / 8;
+}
+
+inline char *writeEightDigits(char *out, std::uint32_t value) noexcept {
+  const std::uint64_t digits = eightDigits(value);
+  std::memcpy(out, &digits, 8);
+  return out + 8;
+}
+
+/// One branch only, at a size that few columns of numbers cross: lengths are random, and a branch at each would cost
+/// more than the digits.
 inline char *writeDecimal(char *out, std::uint32_t value) noexcept {
-  if (value < 10'000) return writeUpToFourDigits(out, value);
-  if (value < 100'000'000) return writeFourDigits(writeUpToFourDigits(out, value / 10'000), value % 10'000);
-  out = writeUpToFourDigits(out, value / 100'000'000);
-  return writeFourDigits(writeFourDigits(out, value / 10'000 % 10'000), value % 10'000);
+  if (value >= 100'000'000) return writeEightDigits(writeUpToFourDigits(out, value / 100'000'000), value % 100'000'000);
+  const std::uint64_t digits = eightDigits(value);
+  const int zeros = leadingZeros(digits);
+  const std::uint64_t text = digits >> 8 * zeros;
+  std::memcpy(out, &text, 8);
+  return out + 8 - zeros;
 }
 
 inline char *writeDecimal(char *out, std::uint64_t value) noexcept {
   if (value <= UINT32_MAX) return writeDecimal(out, static_cast<std::uint32_t>(value));
-  const auto low = static_cast<std::uint32_t>(value % 100'000'000);
-  out = writeDecimal(out, value / 100'000'000);
-  return writeFourDigits(writeFourDigits(out, low / 10'000), low % 10'000);
+  return writeEightDigits(writeDecimal(out, value / 100'000'000), static_cast<std::uint32_t>(value % 100'000'000));
+}
+
+/// |value|, without a branch: signs are as random as lengths.
+template <class Unsigned>
+Unsigned magnitudeOf(Unsigned bits, bool negative) noexcept {
+  const Unsigned mask = Unsigned{0} - negative;
+  return (bits ^ mask) - mask;
 }
 
 inline char *writeDecimal(char *out, std::int32_t value) noexcept {
-  const auto bits = static_cast<std::uint32_t>(value);
-  if (value >= 0) return writeDecimal(out, bits);
   *out = '-';
-  return writeDecimal(out + 1, 0u - bits);
+  return writeDecimal(out + (value < 0), magnitudeOf(static_cast<std::uint32_t>(value), value < 0));
 }
 
 inline char *writeDecimal(char *out, std::int64_t value) noexcept {
-  const auto bits = static_cast<std::uint64_t>(value);
-  if (value >= 0) return writeDecimal(out, bits);
   *out = '-';
-  return writeDecimal(out + 1, std::uint64_t{0} - bits);
-}
-
-/// 0 to 9999 in four columns, blanks for leading zeros; returns how many there are.
-inline unsigned writeFourColumns(char *out, std::uint32_t value) noexcept {
-  std::uint32_t digits;
-  std::memcpy(&digits, kFourDigits.data()[value].data(), 4);
-  const int leadingZeros = std::countr_zero((digits & 0x0F0F0F0Fu) | 0x01000000u) / 8;
-  digits ^= 0x10101010u & ((1u << 8 * leadingZeros) - 1);  // '0' to ' '
-  std::memcpy(out, &digits, 4);
-  return static_cast<unsigned>(leadingZeros);
+  return writeDecimal(out + (value < 0), magnitudeOf(static_cast<std::uint64_t>(value), value < 0));
 }
 
 /// As "%<Width>i" prints it: right-aligned, the sign before the first digit.
 template <unsigned Width>
 char *writeAlignedDecimal(char *out, bool negative, std::uint32_t magnitude) noexcept {
-  static_assert(Width >= 12, "ten digits in three groups of four");
+  static_assert(Width >= 11, "ten digits and a sign");
   std::memset(out, ' ', Width);
-  unsigned first;  // the first digit's column
-  if (magnitude < 10'000) {
-    first = Width - 4 + writeFourColumns(out + Width - 4, magnitude);
-  } else if (magnitude < 100'000'000) {
-    first = Width - 8 + writeFourColumns(out + Width - 8, magnitude / 10'000);
-    writeFourDigits(out + Width - 4, magnitude % 10'000);
+  char *const lastEight = out + Width - 8;
+  char *first = lastEight;
+  if (magnitude < 100'000'000) {
+    std::uint64_t digits = eightDigits(magnitude);
+    const int zeros = leadingZeros(digits);
+    digits ^= 0x1010101010101010u & ((std::uint64_t{1} << 8 * zeros) - 1);  // '0' to ' '
+    std::memcpy(lastEight, &digits, 8);
+    first += zeros;
   } else {
-    first = Width - 12 + writeFourColumns(out + Width - 12, magnitude / 100'000'000);
-    writeFourDigits(out + Width - 8, magnitude / 10'000 % 10'000);
-    writeFourDigits(out + Width - 4, magnitude % 10'000);
+    const std::uint32_t high = magnitude / 100'000'000;
+    first -= high < 10 ? 1 : 2;
+    writeUpToFourDigits(first, high);  // what it writes behind its digits is written over
+    writeEightDigits(lastEight, magnitude % 100'000'000);
   }
-  out[first - 1] = negative ? '-' : ' ';
+  first[-1] = negative ? '-' : ' ';
   return out + Width;
 }
 
@@ -119,7 +136,8 @@ char *writeFixed(char *out, double value) noexcept {
   if (!(scaled < kRounder / 2) || static_cast<double>(static_cast<float>(magnitude)) != magnitude)
     return std::to_chars(out, out + kFixedRoom, magnitude, std::chars_format::fixed, Decimals).ptr;
   const auto units = static_cast<std::uint64_t>((scaled + kRounder) - kRounder);
-  out = writeDecimal(out, units / kUnits);
+  const std::uint64_t whole = units / kUnits;
+  out = whole < 10'000 ? writeUpToFourDigits(out, static_cast<std::uint32_t>(whole)) : writeDecimal(out, whole);
   const auto fraction = static_cast<std::uint32_t>(units % kUnits);
   if constexpr (Decimals == 6) {
     writeFourDigits(out, fraction / 1'000);

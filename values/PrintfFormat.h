@@ -154,7 +154,7 @@ char *writeInteger(char *out, T value) noexcept {
   using Unsigned = std::conditional_t<C.longLong, std::uint64_t, std::uint32_t>;
   const auto bits = static_cast<Unsigned>(value);
   const bool negative = C.kind == 'i' && static_cast<std::make_signed_t<Unsigned>>(bits) < 0;
-  const Unsigned magnitude = negative ? Unsigned{0} - bits : bits;
+  const Unsigned magnitude = magnitudeOf(bits, negative);
   if constexpr (C.kind == 'x' && C.width == 8 && !C.longLong) {
     return writeHex8(out, bits);
   } else if constexpr (C.kind == 'x' || C.kind == 'X') {

@@ -18,6 +18,10 @@ inline constexpr bool kIsArray = false;
 template <class T>
 inline constexpr bool kIsArray<std::vector<T>> = true;
 
+/// The alternatives from here on hold memory.
+constexpr std::size_t kFirstOwner = 9;
+static_assert(std::is_same_v<std::variant_alternative_t<kFirstOwner, ReportValue::Variant>, std::string>);
+
 bool same(float a, float b) noexcept {
   return std::bit_cast<std::uint32_t>(a) == std::bit_cast<std::uint32_t>(b);
 }
@@ -152,7 +156,9 @@ void Dictionary::steal(Dictionary &other) noexcept {
 }
 
 void Dictionary::release() noexcept {
-  std::destroy_n(entries_, size_);
+  // A number has nothing to give back, and most entries are numbers.
+  for (Entry *entry = entries_; entry != entries_ + size_; ++entry)
+    if (entry->value.variant().index() >= kFirstOwner) std::destroy_at(entry);
   if (owns_) ::operator delete(entries_);
 }
 

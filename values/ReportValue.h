@@ -52,6 +52,8 @@ class Dictionary {
   /// Adds a value, a ReportValue or exactly one of its types; std::length_error when the room is used up.
   template <class T>
   void add(Key key, T value);
+  /// Adds a string, made in place: a string's move costs as much as the string.
+  void addText(Key key, std::string_view text);
   /// Adds an empty dictionary with room for `entries`. What it returns is good as long as this dictionary is.
   EntryAdder addDictionary(Key key, std::size_t entries);
 
@@ -86,6 +88,7 @@ class EntryAdder {
 
   template <class T>
   void add(Key key, T value);
+  void addText(Key key, std::string_view text) { dictionary_.addText(key, text); }
   EntryAdder addDictionary(Key key, std::size_t entries) { return dictionary_.addDictionary(key, entries); }
 
  private:
@@ -141,8 +144,8 @@ class ReportValue {
 
  private:
   friend class vesk::Dictionary;  // makes its values in place, and fills the dictionary that it has just added
-  template <class T>
-  ReportValue(std::in_place_type_t<T> type, T &&value) : variant_(type, std::move(value)) {}
+  template <class T, class From>
+  ReportValue(std::in_place_type_t<T> type, From &&from) : variant_(type, std::forward<From>(from)) {}
   vesk::Dictionary &nested() { return std::get<vesk::Dictionary>(variant_); }
 
   Variant variant_;
@@ -200,6 +203,10 @@ void Dictionary::add(Key key, T value) {
 template <class T>
 void EntryAdder::add(Key key, T value) {
   dictionary_.add(key, std::move(value));
+}
+
+inline void Dictionary::addText(Key key, std::string_view text) {
+  emplace(key, std::in_place_type<std::string>, text);
 }
 
 }  // namespace vesk

@@ -39,14 +39,14 @@ constexpr std::array<OptionText, 256> kOptionWithLevel = optionTexts(true);
 constexpr std::array<OptionText, 256> kOptionWithoutLevel = optionTexts(false);
 
 void addOption(EntryAdder out, std::uint8_t option) {
-  out.add("ERROR_LEVEL", std::string(levelName(option & kLevelMask)));
+  out.addText("ERROR_LEVEL", levelName(option & kLevelMask));
   out.add("OPTIONS_RAW", i32(option));  // whole: a consumer takes the flags out of it
 }
 
 }  // namespace vesk
 
 void HIDReportVeskPlugin::errorLevelToString(std::uint8_t level, const char **levelStr) const {
-  *levelStr = vesk::levelName(level);
+  *levelStr = vesk::levelName(level).data();  // of a literal, so a zero ends it
 }
 
 std::string HIDReportVeskPlugin::blackBoxOptionToString(std::uint8_t option, const char *eventName,

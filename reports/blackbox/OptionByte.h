@@ -13,8 +13,8 @@ namespace vesk {
 constexpr std::uint8_t kLevelMask = 0x07;
 
 /// "TRACE" to "CRITICAL" for 0 to 5, "UNKNOWN" for all others.
-constexpr const char *levelName(std::uint8_t level) {
-  constexpr const char *kNames[] = {"TRACE", "DEBUG", "INFO", "WARNING", "ERROR", "CRITICAL"};
+constexpr std::string_view levelName(std::uint8_t level) {
+  constexpr std::string_view kNames[] = {"TRACE", "DEBUG", "INFO", "WARNING", "ERROR", "CRITICAL"};
   return level > 5 ? "UNKNOWN" : kNames[level];
 }
 
