@@ -13,6 +13,7 @@ namespace {
 
 using fuzz::check;
 using fuzz::checkSame;
+using fuzz::RecordedReports;
 using nlohmann::json;
 using namespace vesk::host;
 
@@ -53,11 +54,13 @@ struct Settings {
 };
 
 Run run(const Settings &settings, const char *form, unsigned jobs) {
-  static std::FILE *nowhere = std::fopen("/dev/null", "w");
+  char *printed = nullptr;
+  std::size_t printedSize = 0;
+  std::FILE *stream = open_memstream(&printed, &printedSize);
   Messages::Options options;
   options.verbose = true;
   options.lenient = settings.format.lenient;
-  Messages messages(options, nowhere);
+  Messages messages(options, stream);
   Run result;
   {
     OutputFile output(pathOf("out"));
@@ -76,6 +79,10 @@ Run run(const Settings &settings, const char *form, unsigned jobs) {
   for (const auto &kept : messages.kept())
     result.messages +=
         std::string(kept.first.kind->code) + " " + std::to_string(kept.count) + " " + kept.first.text + "\n";
+  std::fclose(stream);
+  for (const char c : std::string_view(printed, printedSize))
+    check(c == '\n' || (static_cast<unsigned char>(c) >= ' ' && c != 0x7F), "messages hold nothing for terminals");
+  std::free(printed);
   result.output = contentOf(pathOf("out"));
   return result;
 }

@@ -5,8 +5,30 @@
 
 #include "host/diagnostics/Progress.h"
 #include "values/PrintfFormat.h"
+#include "values/Utf8.h"
 
 namespace vesk::host {
+
+namespace {
+
+/// Appends text of inputs, with what a terminal would obey rather than show as \xNN. Line feeds are our own: what is
+/// quoted of an input is never more than a line.
+void appendPrintable(std::string &line, std::string_view text) {
+  const bool isText = isUtf8(text);
+  for (std::size_t i = 0; i < text.size(); ++i) {
+    const auto byte = static_cast<unsigned char>(text[i]);
+    const bool isLongControl = byte == 0xC2 && i + 1 < text.size() && static_cast<unsigned char>(text[i + 1]) < 0xA0;
+    if ((byte < ' ' && byte != '\n') || byte == 0x7F || (byte >= 0x80 && !isText)) {
+      line += formatted<"\\x%02X">(std::uint32_t{byte});
+    } else if (isLongControl) {
+      line += formatted<"\\x%02X">(std::uint32_t{static_cast<unsigned char>(text[++i])});
+    } else {
+      line += text[i];
+    }
+  }
+}
+
+}  // namespace
 
 std::string_view severityName(Severity severity) {
   constexpr std::string_view kNames[] = {"note", "warning", "error"};
@@ -50,7 +72,10 @@ void Messages::finishFile(std::string_view file) {
 void Messages::print(const Message &message, Severity severity, std::string_view text) const {
   std::string line(options_.overProgress ? kClearLine : "");
   const std::size_t start = line.size();
-  if (!message.file.empty()) line += message.file + ":";
+  if (!message.file.empty()) {
+    appendPrintable(line, message.file);
+    line += ':';
+  }
   if (const std::string place = message.place.text(); !place.empty()) line += place + ":";
   if (line.size() != start) line += ' ';
   const char *colour = severity == Severity::kError     ? "\x1b[1;31m"
@@ -62,7 +87,7 @@ void Messages::print(const Message &message, Severity severity, std::string_view
   if (options_.colour) line += "\x1b[0m";
   line += ' ';
   if (message.reportId) line += formatted<"0x%02X: ">(*message.reportId);
-  line += text;
+  appendPrintable(line, text);
   line += '\n';
   std::fwrite(line.data(), 1, line.size(), stream_);
 }
