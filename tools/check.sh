@@ -38,6 +38,7 @@ steps() {
   step clang 20
   step tidy 25
   step fuzz 15 tools/fuzz.sh 30
+  step instructions 20 tools/check_instructions
 }
 
 wanted=("$@") done=0 passed=0 failed=0
