@@ -138,7 +138,7 @@ void checkConversions(const Settings &settings, const std::vector<std::string> &
     if (converted.exitCode != 0 || converted.reports == 0) continue;
     const auto back = readBack(kind, converted.output);
     check(back.bytes == wanted, std::string("what was converted to ") + form + " reads back as it was");
-    check(back.messages == 0, std::string("what was converted to ") + form + " reads back in silence: " + back.story);
+    check(back.errors == 0, std::string("what was converted to ") + form + " reads back: " + back.story);
   }
 }
 

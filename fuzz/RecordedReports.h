@@ -32,10 +32,11 @@ class RecordedReports : public vesk::host::ReadSink {
     check(message.file == file_, "a message names its file");
     story += std::string(message.kind->code) + " " + message.place.text() + " " + message.text + "\n";
     ++messages;
+    if (message.kind->severity == vesk::host::Severity::kError) ++errors;
   }
 
   std::vector<std::string> bytes;
-  std::size_t messages = 0;
+  std::size_t messages = 0, errors = 0;
   std::string story;  // all of it, in order
 
  private:
