@@ -1,6 +1,7 @@
 #!/bin/bash
 # Fuzzes every target, each for some seconds, two at a time. Findings stay in build/fuzz/findings and make it fail.
 # Usage: tools/fuzz.sh [SECONDS] [TARGET]...     (20 seconds and all targets)
+# VESK_FUZZ_SEED, where it is set, makes a run one that can be repeated.
 # What was learned stays in build/fuzz/corpus and is built upon by the next run.
 set -euo pipefail
 
@@ -22,6 +23,7 @@ fuzz() {
   local options=(-max_total_time="$seconds" -max_len=16384 -timeout=10 -rss_limit_mb=2048 -print_final_stats=1
                  -artifact_prefix="build/fuzz/findings/$target-")
   if [[ -e fuzz/dictionaries/$target.dict ]]; then options+=(-dict="fuzz/dictionaries/$target.dict"); fi
+  if [[ -n ${VESK_FUZZ_SEED-} ]]; then options+=(-seed="$VESK_FUZZ_SEED"); fi
   mkdir -p "$learned" build/fuzz/findings
   # What a target says about its inputs on standard error is much, and is no finding.
   if ! "build/fuzz/fuzz/$target" "${options[@]}" "$learned" "fuzz/corpus/$target" >"$log" 2>&1 </dev/null; then
