@@ -5,6 +5,7 @@
 // seen, not those that the C library makes for itself.
 #include <dlfcn.h>
 #include <fcntl.h>
+#include <pthread.h>
 #include <sys/stat.h>
 #include <sys/types.h>
 #include <unistd.h>
@@ -18,9 +19,9 @@
 
 namespace {
 
-enum Call { kOpen, kRead, kWrite, kClose, kRename, kFsync, kMkostemp, kStat, kIoctl, kCalls };
+enum Call { kOpen, kRead, kWrite, kClose, kRename, kFsync, kMkostemp, kStat, kIoctl, kThread, kCalls };
 constexpr const char *kNames[kCalls] = {"open",  "read",     "write", "close", "rename",
-                                        "fsync", "mkostemp", "stat",  "ioctl"};
+                                        "fsync", "mkostemp", "stat",  "ioctl", "thread"};
 
 struct Fault {
   int call = -1;
@@ -84,6 +85,13 @@ mode_t modeOf(int flags, va_list arguments) {
 }  // namespace
 
 extern "C" {
+
+int pthread_create(pthread_t *thread, const pthread_attr_t *attributes, void *(*start)(void *),
+                   void *argument) noexcept {
+  if (fate(kThread) == Fate::kFails) return fault().error;
+  return next<int(pthread_t *, const pthread_attr_t *, void *(*)(void *), void *)>("pthread_create")(thread, attributes,
+                                                                                                     start, argument);
+}
 
 int open(const char *path, int flags, ...) {
   va_list arguments;

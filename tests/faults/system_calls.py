@@ -171,9 +171,13 @@ def check_closed_descriptors(bench):
 def check_few_threads(bench):
     """Where the machine gives fewer threads than were asked for, those that it gives do the work."""
     whole = bench.run("text", to_file=False).stdout
-    result = subprocess.run(["bash", "-c", 'ulimit -v 400000; exec "$0" decode --jobs 256 "$1"', PROGRAM, str(bench.input)],
-                            stdout=subprocess.PIPE, stderr=subprocess.PIPE)
-    expect(result.returncode == 0 and result.stdout == whole, f"few threads: {result.returncode} {result.stderr}")
+    for number in range(2, 9):
+        result = bench.run("text", f"thread {number} {errno.EAGAIN}", jobs="8", to_file=False)
+        expect(result.returncode == 0 and result.stdout == whole,
+               f"{number - 1} of 8 threads: {result.returncode} {result.errors}")
+    result = bench.run("text", f"thread 1 {errno.EAGAIN}", jobs="8", to_file=False)
+    expect(result.returncode == 3 and b"vesk-report: error: " in result.stderr,
+           f"no thread at all: {result.returncode} {result.errors}")
 
 
 def main():
