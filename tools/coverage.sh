@@ -1,19 +1,26 @@
 #!/bin/bash
 # What the tests reach: lines and branches of the core (all of them must be) and lines of the host (95 % must be).
-# Usage: tools/coverage.sh [--show]     (--show: what is not reached, line by line)
-# Outcomes that only a thrown exception takes are not counted: they stand behind every call, and what they do is seen
-# where each allocation fails in turn (tests/faults).
+# Usage: tools/coverage.sh [--show]     (--show: what is not reached in the host too, line by line)
+# clang counts the outcomes of conditions as they stand in the source; the ways that only an exception takes are no
+# conditions, and are walked where each allocation fails in turn (tests/faults).
 set -euo pipefail
 
 cd "$(dirname "$0")/.."
-show=
 case ${1-} in
-  '') ;;
-  --show) show=--show ;;
+  '' | --show) ;;
   *) echo "Usage: tools/coverage.sh [--show]" >&2; exit 2 ;;
 esac
 tools/build coverage
-find build/coverage -name '*.gcda' -delete
-ctest --test-dir build/coverage --parallel 2 --output-on-failure --no-tests=error --label-exclude kernel --quiet >build/coverage/tests.log 2>&1 </dev/null ||
-  { cat build/coverage/tests.log; exit 1; }
-exec python3 -B tools/coverage.py build/coverage $show
+folder=build/coverage
+rm -rf "$folder/profiles"
+export LLVM_PROFILE_FILE=$PWD/$folder/profiles/%m-%p.profraw  # from here on every program that runs leaves its counts
+ctest --test-dir "$folder" --parallel 2 --output-on-failure --no-tests=error --label-exclude kernel \
+  >"$folder/tests.log" 2>&1 </dev/null || { cat "$folder/tests.log" >&2; exit 1; }
+
+find "$folder/profiles" -name '*.profraw' >"$folder/profiles.list"
+llvm-profdata-14 merge -sparse -f "$folder/profiles.list" -o "$folder/all.profdata"
+objects=()
+while read -r program; do objects+=(-object "$program"); done < <(
+  find "$folder" -type f -executable \( -name '*_tests' -o -name 'Fuzz*' -o -name vesk-report -o -name 'lib*.so' \))
+llvm-cov-14 export -format=lcov -instr-profile "$folder/all.profdata" "${objects[@]}" >"$folder/all.lcov"
+exec python3 -B tools/coverage.py "$folder/all.lcov" "$@"
