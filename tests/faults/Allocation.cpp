@@ -116,7 +116,9 @@ bool same(const ReportResult &a, const ReportResult &b) {
 class Allocation : public testing::TestWithParam<std::tuple<Case, bool, bool>> {};
 
 TEST_P(Allocation, EachOneThatFailsLeavesNothingBehind) {
-  const auto [report, strings, decimal] = GetParam();
+  // No structured binding: clang 14 cannot use one in a lambda.
+  const Case report = std::get<0>(GetParam());
+  const bool strings = std::get<1>(GetParam()), decimal = std::get<2>(GetParam());
   const PaddedReport padded(bytesOf(report));
   const auto plugin = HIDReportVeskPlugin::init();
   plugin->setUseStrings(strings);
@@ -154,8 +156,8 @@ TEST_P(Allocation, EachOneThatFailsLeavesNothingBehind) {
 }
 
 TEST_P(Allocation, EachOneThatFailsInACopyLeavesNothingBehind) {
-  const auto [report, strings, decimal] = GetParam();
-  if (strings) return;  // lines cannot be copied
+  const Case report = std::get<0>(GetParam());
+  if (std::get<1>(GetParam())) return;  // lines cannot be copied
   const PaddedReport padded(bytesOf(report));
   const auto plugin = HIDReportVeskPlugin::init();
   const ReportResult result = Decode{*plugin, padded, report.id}();
@@ -176,7 +178,7 @@ TEST_P(Allocation, EachOneThatFailsInACopyLeavesNothingBehind) {
 }
 
 TEST_P(Allocation, NothingIsPrintedWhereOneFails) {
-  const auto [report, strings, decimal] = GetParam();
+  const Case report = std::get<0>(GetParam());
   const PaddedReport padded(bytesOf(report));
   const auto plugin = HIDReportVeskPlugin::init();
   const std::int32_t type = report.id == 0x76 || report.id == 0x77 ? 0 : 2;
