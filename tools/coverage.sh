@@ -22,5 +22,7 @@ llvm-profdata-14 merge -sparse -f "$folder/profiles.list" -o "$folder/all.profda
 objects=()
 while read -r program; do objects+=(-object "$program"); done < <(
   find "$folder" -type f -executable \( -name '*_tests' -o -name 'Fuzz*' -o -name vesk-report -o -name 'lib*.so' \))
-llvm-cov-14 export -format=lcov -instr-profile "$folder/all.profdata" "${objects[@]}" >"$folder/all.lcov"
-exec python3 -B tools/coverage.py "$folder/all.lcov" "$@"
+for format in lcov text; do
+  llvm-cov-14 export -format="$format" -instr-profile "$folder/all.profdata" "${objects[@]}" >"$folder/coverage.$format"
+done
+exec python3 -B tools/coverage.py "$folder/coverage.lcov" "$folder/coverage.text" "$@"

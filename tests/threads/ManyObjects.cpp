@@ -19,7 +19,8 @@ bool isInput(unsigned id) {
 PaddedReport reportOf(unsigned id, unsigned seed) {
   std::mt19937 random(seed);
   std::string bytes(id == 0x76 ? 792 : id == 0x77 ? 2064 : 1023, '\0');
-  for (char &c : bytes) c = static_cast<char>(id == 0xD0 || id == 0xD2 ? "abc\n"[random() % 4] : random() & 0xFF);
+  const bool isText = id == 0xD0 || id == 0xD2;
+  for (char &c : bytes) c = isText ? "abc\n"[random() % 4] : static_cast<char>(random() & 0xFF);
   bytes[0] = static_cast<char>(id);
   return PaddedReport(bytes);
 }
