@@ -30,6 +30,12 @@ tidy() {
     printf '%s\n' "${sources[@]}" | xargs -P 2 -n 4 clang-tidy-14 -p build/clang --quiet
 }
 
+# What it misreads is listed, with reasons.
+cppcheck() {
+  command cppcheck --quiet --std=c++20 --language=c++ --enable=warning,performance,portability --error-exitcode=1 \
+    --suppressions-list=tools/cppcheck-suppressions.txt -I. values plugin reports host
+}
+
 # Each step, the minutes that it may take, and the command where it is not a function above.
 steps() {
   step format 1
@@ -37,7 +43,10 @@ steps() {
   step tests 45
   step clang 20
   step tidy 25
+  step cppcheck 10
   step fuzz 15 tools/fuzz.sh 30
+  step coverage 40 tools/coverage.sh
+  step threads 30 tools/threads.sh
   step instructions 20 tools/check_instructions
 }
 

@@ -268,9 +268,11 @@ class Bench:
 
 
 def known_equivalents():
-    if not EQUIVALENT.exists():
-        return set()
-    return {line.strip() for line in EQUIVALENT.read_text().splitlines() if " ==> " in line}
+    """A test for keys that are listed, as they stand or, behind a tilde, as a regular expression."""
+    lines = [line.strip() for line in EQUIVALENT.read_text().splitlines() if " ==> " in line] if EQUIVALENT.exists() else []
+    literal = {line for line in lines if not line.startswith("~ ")}
+    patterns = [re.compile(line[2:]) for line in lines if line.startswith("~ ")]
+    return lambda key: key in literal or any(pattern.fullmatch(key) for pattern in patterns)
 
 
 def chosen_mutants(options):
@@ -296,11 +298,11 @@ def main():
         print(*mutants, sep="\n")
         return
     bench = Bench(options.jobs)
-    equivalents = known_equivalents()
+    is_equivalent = known_equivalents()
     counts = {"killed": 0, "compiler": 0, "survived": 0, "equivalent": 0}
     with concurrent.futures.ThreadPoolExecutor(options.jobs) as pool, open(BUILD / "results.jsonl", "w") as log:
         for mutant, verdict in zip(mutants, pool.map(bench.judge, mutants)):
-            if verdict == "survived" and mutant.key in equivalents:
+            if verdict == "survived" and is_equivalent(mutant.key):
                 verdict = "equivalent"
             counts[verdict] += 1
             log.write(json.dumps({"mutant": str(mutant), "verdict": verdict}) + "\n")
