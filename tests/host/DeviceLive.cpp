@@ -202,7 +202,9 @@ TEST_F(Runs, endAfterTheDuration) {
 
 TEST_F(Runs, endAtASignalAndDeliverWhatWasRead) {
   node_->inputs = {image(1), image(2)};
-  keeper_.onReport = [&](const SourceReport &) { stop_.request(); };
+  keeper_.onReport = [&](const SourceReport &) {
+    if (keeper_.reports.size() == 2) stop_.request();
+  };
   EXPECT_EQ(run().inputs, 2u);
   EXPECT_THAT(keeper_.messages, IsEmpty()) << "a stop is no device that goes";
 }
