@@ -88,7 +88,7 @@ finish interrupted
 background terminated -- vesk-report watch
 waitOpen plain
 tell plain 'stream 100 5 77'
-waitLines terminated 100
+waitLines terminated 360  # five packets of 70 lines between two empty ones
 signalStep terminated TERM
 finish terminated
 recording killed
