@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <string_view>
+#include <utility>
 
 #include "plugin/HIDReportVeskPlugin.h"
 
@@ -14,14 +15,20 @@ constexpr std::uint32_t kValuesPerLine = 8;
 template <class Field, class Write>
 void addLines(DisplayLines &lines, const void *data, std::uint32_t count, std::size_t room, Write write) {
   const auto *field = static_cast<const Field *>(data);
-  for (; count > kValuesPerLine; count -= kValuesPerLine) {  // whole lines, so that the compiler knows how many values
-    char *out = lines.room(kValuesPerLine * room + 1);
-    for (std::uint32_t i = 0; i < kValuesPerLine; ++i) out = write(out, *field++);
-    lines.endLine(out);
-  }
-  char *out = lines.room(count * room + 1);
-  for (std::uint32_t i = 0; i < count; ++i) out = write(out, *field++);
-  lines.endLine(out);
+  const std::uint32_t wholeLines = count / kValuesPerLine, rest = count % kValuesPerLine;
+  lines.rows(wholeLines, kValuesPerLine * room, [&](char *out, std::size_t) {
+    [&]<std::size_t... I>(std::index_sequence<I...>) {
+      ((out = write(out, field[I])), ...);
+    }
+    (std::make_index_sequence<kValuesPerLine>());
+    field += kValuesPerLine;
+    return out;
+  });
+  if (rest == 0 && wholeLines != 0) return;
+  lines.rows(1, rest * room, [&](char *out, std::size_t) {
+    for (std::uint32_t i = 0; i < rest; ++i) out = write(out, field[i]);
+    return out;
+  });
 }
 
 template <FormatText F, class Field>

@@ -54,7 +54,7 @@ inline char *writeEightDigits(char *out, std::uint32_t value) noexcept {
 
 /// One branch only, at a size that few columns of numbers cross: lengths are random, and a branch at each would cost
 /// more than the digits.
-inline char *writeDecimal(char *out, std::uint32_t value) noexcept {
+[[gnu::always_inline]] inline char *writeDecimal(char *out, std::uint32_t value) noexcept {
   if (value >= 100'000'000) return writeEightDigits(writeUpToFourDigits(out, value / 100'000'000), value % 100'000'000);
   const std::uint64_t digits = eightDigits(value);
   const int zeros = leadingZeros(digits);

@@ -100,16 +100,19 @@ T plain(const LittleEndian<T> &field) {
   return field;
 }
 
+/// The most that a number or a block takes.
+template <Conversion C, class T>
+inline constexpr std::size_t kRoom = C.width + (C.kind == 'f' ? kFixedRoom + 1 : kNumberRoom);
+template <Conversion C, class T>
+requires kIsBlock<T>
+inline constexpr std::size_t kRoom<C, T> = T::kBlock;
+
 template <Conversion C, class T>
 std::size_t room(const T &argument) noexcept {
-  if constexpr (kIsBlock<T>)
-    return T::kBlock;
-  else if constexpr (C.kind == 's')
+  if constexpr (C.kind == 's' && !kIsBlock<T>)
     return C.width + std::string_view(argument).size();
-  else if constexpr (C.kind == 'f')
-    return C.width + kFixedRoom + 1;
   else
-    return C.width + kNumberRoom;
+    return kRoom<C, T>;
 }
 
 /// Moves [begin, end) to the right edge of `width` columns that start at `begin`.
@@ -148,7 +151,7 @@ char *writeFloat(char *out, double value) noexcept {
 }
 
 template <Conversion C, class T>
-char *writeInteger(char *out, T value) noexcept {
+[[gnu::always_inline]] inline char *writeInteger(char *out, T value) noexcept {
   static_assert(std::is_integral_v<T> && (sizeof(T) == 8) == C.longLong,
                 "a 64-bit number is printed with ll, no other is");
   using Unsigned = std::conditional_t<C.longLong, std::uint64_t, std::uint32_t>;
@@ -162,8 +165,9 @@ char *writeInteger(char *out, T value) noexcept {
   } else if constexpr (C.width >= 12 && !C.longLong) {
     return writeAlignedDecimal<C.width>(out, negative, magnitude);
   } else {
-    *out = '-';
-    return alignRight(out, writeDecimal(out + negative, magnitude), C.width);
+    char *first = out;
+    if (negative) [[unlikely]] *first++ = '-';
+    return alignRight(out, writeDecimal(first, magnitude), C.width);
   }
 }
 
@@ -205,6 +209,13 @@ struct Format {
     }
     (std::index_sequence_for<Args...>());
   }
+
+  /// The most bytes that a line takes, whatever its numbers and blocks are.
+  template <class... Args>
+  static constexpr std::size_t kRoom = []<std::size_t... I>(std::index_sequence<I...>) {
+    return (format::kLength<F> + ... + format::kRoom<format::kConversions<F>[I], Args>);
+  }
+  (std::index_sequence_for<Args...>());
 
   /// REQUIRES: room(args...) writable bytes. Returns the end of the text; no terminating zero.
   template <class... Args>

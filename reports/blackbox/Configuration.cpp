@@ -1,4 +1,5 @@
 // Black box configuration, feature 0xE2: one option byte for each severity level and for each event.
+#include <algorithm>
 #include <array>
 
 #include "plugin/HIDReportVeskPlugin.h"
@@ -38,12 +39,34 @@ constexpr std::array<std::size_t, kModules> kModuleOffsets = [] {
 static_assert(kModuleOffsets[kBlobLafe] == 33 && kModuleOffsets[kHidspiMaster] == 96 && kModuleOffsets[kQor] == 194);
 static_assert(kModuleOffsets[kHidspiSlave] == 204 && kModuleOffsets[kPmgr] == 233 && kModuleOffsets[kBlobLsfn] == 234);
 
+/// Which byte holds an event's options.
+constexpr std::size_t optionByte(std::size_t module, std::size_t event) {
+  return kModuleOffsets[module] + event + (module == kQor && event >= kQorGap ? 1 : 0);
+}
+
+constexpr std::size_t kDoubleOpen = 3, kSingleOpen = 4;
+
+/// Which byte the screen shows for it: OPEN_SHORT_EVENT_SINGLE_OPEN shows that of OPEN_SHORT_EVENT_DOUBLE_OPEN, for the
+/// panel test sets both alike and its screens are compared by line. A dictionary holds the event's own byte.
+constexpr std::size_t shownByte(std::size_t module, std::size_t event) {
+  return optionByte(module, module == kOpenShortTest && event == kSingleOpen ? kDoubleOpen : event);
+}
+
+using EventBytes =
+    std::array<std::array<std::uint8_t, *std::max_element(kEventCounts.begin(), kEventCounts.end())>, kModules>;
+
+/// A byte's place for each event of each module.
+consteval EventBytes eventBytes(std::size_t (*place)(std::size_t module, std::size_t event)) {
+  EventBytes bytes{};
+  for (std::size_t m = 0; m < kModules; ++m)
+    for (std::size_t e = 0; e < kEventCounts[m]; ++e) bytes[m][e] = static_cast<std::uint8_t>(place(m, e));
+  return bytes;
+}
+constexpr EventBytes kOptionBytes = eventBytes(optionByte);
+constexpr EventBytes kShownBytes = eventBytes(shownByte);
+
 struct Layout {
   std::array<U8, 241> bytes;  // the report ID first
-
-  std::uint8_t option(ModuleIndex module, std::size_t event) const {
-    return bytes[kModuleOffsets[module] + event + (module == kQor && event >= kQorGap ? 1 : 0)];
-  }
 };
 static_assert(sizeof(Layout) == kModuleOffsets[kBlobLsfn] + kEventCounts[kBlobLsfn]);
 
@@ -53,25 +76,22 @@ constexpr std::size_t kEntries = [] {
   return count;
 }();
 
-constexpr std::size_t kDoubleOpen = 3, kSingleOpen = 4;
-
-/// On screen, OPEN_SHORT_EVENT_SINGLE_OPEN shows the byte of OPEN_SHORT_EVENT_DOUBLE_OPEN: the panel test sets both
-/// alike and its screens are compared by line. A dictionary holds the event's own byte.
-std::size_t shownEvent(ModuleIndex module, std::size_t event) {
-  return module == kOpenShortTest && event == kSingleOpen ? kDoubleOpen : event;
-}
-
 void addEvents(DisplayLines &out, const Layout &r, ModuleIndex module) {
   const auto events = kCatalogue[module].events;
-  for (std::size_t e = 0; e < events.size(); ++e)
-    out.line<"%40s: %s">(events[e].label, kOptionWithLevel[r.option(module, shownEvent(module, e))]);
+  const auto &shown = kShownBytes[module];
+  using Row = Format<"%40s: %s%s">;
+  constexpr std::size_t kRoom = Row::kRoom<Label<40>, TextBlock<16>, FlagText>;
+  out.rows(events.size(), kRoom, [=, &r, &shown](char *row, std::size_t e) {
+    const std::uint8_t option = r.bytes[shown[e]];
+    return Row::write(row, events[e].label, kLevelTexts[option & kLevelMask], kFlagTexts[option >> kFlagShift]);
+  });
   out.add("");
 }
 
 DisplayLines toLines(const Layout &r) {
   DisplayLines out(272, 24576);
   for (std::size_t g = 0; g < std::size(kGlobals); ++g)
-    out.line<"%40s:  %s">(kGlobals[g].label, kOptionWithoutLevel[r.bytes[kFirstGlobal + g]]);
+    out.line<"%40s:  %s">(kGlobals[g].label, kFlagTexts[r.bytes[kFirstGlobal + g] >> kFlagShift]);
   out.add("");
   for (const ModuleIndex module : kFunctionalOrder) addEvents(out, r, module);
   for (const ModuleIndex module : kBlobOrder) {
@@ -83,7 +103,8 @@ DisplayLines toLines(const Layout &r) {
 
 void addEvents(Dictionary &out, const Layout &r, ModuleIndex module) {
   const auto events = kCatalogue[module].events;
-  for (std::size_t e = 0; e < events.size(); ++e) addOption(out.addDictionary(events[e].key, 2), r.option(module, e));
+  for (std::size_t e = 0; e < events.size(); ++e)
+    addOption(out.addDictionary(events[e].key, 2), r.bytes[kOptionBytes[module][e]]);
 }
 
 ReportValue toValue(const Layout &r) {

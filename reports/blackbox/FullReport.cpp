@@ -14,6 +14,14 @@ struct BlockHead {
 };
 static_assert(sizeof(BlockHead) == 4);
 
+/// One module's block within a layout.
+struct Block {
+  BlockHead head;
+  const char *counters;
+
+  U32 counter(std::size_t event) const { return read<U32>(counters + sizeof(U32) * event); }
+};
+
 constexpr std::size_t kFirstBlock = 3;  // behind the report ID and the module count
 
 constexpr std::size_t blockSize(std::size_t module) {
@@ -35,13 +43,10 @@ struct Layout {
   U16 moduleCount;
   std::array<char, 1020> blocks;
 
-  BlockHead head(ModuleIndex module) const { return read<BlockHead>(block(module)); }
-  U32 counter(ModuleIndex module, std::size_t event) const {
-    return read<U32>(block(module) + sizeof(BlockHead) + sizeof(U32) * event);
+  Block block(ModuleIndex module) const {
+    const char *bytes = blocks.data() + (kBlockOffsets[module] - kFirstBlock);
+    return {read<BlockHead>(bytes), bytes + sizeof(BlockHead)};
   }
-
- private:
-  const char *block(ModuleIndex module) const { return blocks.data() + (kBlockOffsets[module] - kFirstBlock); }
 };
 static_assert(sizeof(Layout) == 1023 && sizeof(Layout) == kBlockOffsets[kBlobLsfn] + blockSize(kBlobLsfn));
 
@@ -53,14 +58,16 @@ constexpr std::size_t kEntries = [] {
 
 void addBlock(DisplayLines &out, const Layout &r, ModuleIndex index, bool isBlob) {
   const Module &module = kCatalogue[index];
-  const BlockHead head = r.head(index);
+  const Block block = r.block(index);
   if (isBlob)
-    out.line<"%30s Module ID: 0x%04X">(module.name.text(), head.moduleId);
+    out.line<"%30s Module ID: 0x%04X">(module.name.text(), block.head.moduleId);
   else
-    out.line<"%40s: 0x%04X">(module.idLabel, head.moduleId);
-  out.line<"%40s: %i">(module.countLabel, head.eventCount);
-  for (std::size_t e = 0; e < module.events.size(); ++e)
-    out.line<"%40s: %i">(module.events[e].label, r.counter(index, e));
+    out.line<"%40s: 0x%04X">(module.idLabel, block.head.moduleId);
+  out.line<"%40s: %i">(module.countLabel, block.head.eventCount);
+  const auto events = module.events;
+  using Row = Format<"%40s: %i">;
+  out.rows(events.size(), Row::kRoom<Label<40>, U32>,
+           [=](char *row, std::size_t e) { return Row::write(row, events[e].label, block.counter(e)); });
   out.add("");
 }
 
@@ -77,12 +84,12 @@ DisplayLines toLines(const Layout &r) {
 
 void addBlock(Dictionary &out, const Layout &r, ModuleIndex index) {
   const Module &module = kCatalogue[index];
-  EntryAdder block = out.addDictionary(module.name, 2 + module.events.size());
-  const BlockHead head = r.head(index);
-  block.add(module.idKey, u16(head.moduleId));
-  if (index != kPmgr)
-    block.add(module.countKey, u16(head.eventCount));  // PMGR's dictionary has no event count; its lines have one
-  for (std::size_t e = 0; e < module.events.size(); ++e) block.add(module.events[e].key, u32(r.counter(index, e)));
+  EntryAdder entries = out.addDictionary(module.name, 2 + module.events.size());
+  const Block block = r.block(index);
+  entries.add(module.idKey, u16(block.head.moduleId));
+  // PMGR's dictionary has no event count; its lines have one.
+  if (index != kPmgr) entries.add(module.countKey, u16(block.head.eventCount));
+  for (std::size_t e = 0; e < module.events.size(); ++e) entries.add(module.events[e].key, u32(block.counter(e)));
 }
 
 ReportValue toValue(const Layout &r) {

@@ -18,12 +18,13 @@ constexpr std::string_view levelName(std::uint8_t level) {
   return level > 5 ? "UNKNOWN" : kNames[level];
 }
 
-/// The words of an option byte, as they stand behind the colon.
-using OptionText = TextBlock<48>;
+/// levelName() and a blank, for the rows that are printed most.
+extern const std::array<TextBlock<16>, kLevelMask + 1> kLevelTexts;
 
-/// With the level for an event, without it for a global setting.
-extern const std::array<OptionText, 256> kOptionWithLevel;
-extern const std::array<OptionText, 256> kOptionWithoutLevel;
+constexpr unsigned kFlagShift = 3;
+using FlagText = TextBlock<40>;
+/// The words of the flags in bits 3 to 7, each with a blank behind it; "(no options set)" for none.
+extern const std::array<FlagText, 32> kFlagTexts;
 
 /// Fills a dictionary that has room for two entries.
 void addOption(EntryAdder out, std::uint8_t option);

@@ -25,7 +25,7 @@ static_assert(sizeof(Layout) == 792);
 static_assert(offsetof(Layout, dScanI) == 16 && offsetof(Layout, pScanI) == 400 && offsetof(Layout, tmonParams) == 784);
 
 struct Block {
-  const char *heading;
+  std::string_view heading;
   Key key;
   Samples Layout::*samples;
 };

@@ -24,16 +24,24 @@ std::optional<std::string_view> versionText(const char *report) {
   throw std::invalid_argument("HIDReportVeskPlugin: the version text is not UTF-8");
 }
 
-/// Cuts the first line off `rest`, which becomes nothing behind the last line.
-std::string_view takeLine(std::optional<std::string_view> &rest) {
-  const std::size_t lineFeed = rest->find('\n');
-  const std::string_view line = rest->substr(0, lineFeed);
-  if (lineFeed == std::string_view::npos)
-    rest.reset();
-  else
-    rest->remove_prefix(lineFeed + 1);
-  return line;
-}
+/// Takes a text apart at its line feeds. A text has one line more than it has line feeds.
+class LineTaker {
+ public:
+  explicit LineTaker(std::string_view text) : rest_(text) {}
+
+  bool hasMore() const { return hasMore_; }
+  std::string_view take() {
+    const std::size_t lineFeed = rest_.find('\n');
+    const std::string_view line = rest_.substr(0, lineFeed);
+    hasMore_ = lineFeed != std::string_view::npos;
+    if (hasMore_) rest_.remove_prefix(lineFeed + 1);
+    return line;
+  }
+
+ private:
+  std::string_view rest_;
+  bool hasMore_ = true;
+};
 
 DisplayLines toLines(std::string_view version) {
   DisplayLines out(1, version.size() + 1);
@@ -43,16 +51,16 @@ DisplayLines toLines(std::string_view version) {
 
 DisplayLines toComponentLines(std::string_view version) {
   DisplayLines out(kComponents.size() + 1, version.size() + 1);
-  for (std::optional rest = version; rest;) out.add(takeLine(rest));
+  for (LineTaker lines(version); lines.hasMore();) out.add(lines.take());
   return out;
 }
 
 ReportValue toComponents(std::string_view version) {
   Dictionary out(kComponents.size());
-  std::optional rest = version;
+  LineTaker lines(version);
   for (const Key component : kComponents) {
-    if (!rest) throw std::out_of_range("HIDReportVeskPlugin: the extended version has fewer than six lines");
-    out.add(component, std::string(takeLine(rest)));
+    if (!lines.hasMore()) throw std::out_of_range("HIDReportVeskPlugin: the extended version has fewer than six lines");
+    out.add(component, std::string(lines.take()));
   }
   return ReportValue(std::move(out));
 }

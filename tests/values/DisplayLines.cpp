@@ -71,12 +71,24 @@ TEST(DisplayLines, FormatsAndPlainTextInTurn) {
   EXPECT_EQ(lines[199], "-");
 }
 
-TEST(DisplayLines, ALineMadeInItsRoom) {
+TEST(DisplayLines, RowsMadeInTheirRoom) {
   DisplayLines lines;
-  char *out = lines.room(1000);
-  std::fill_n(out, 999, 'x');
-  lines.endLine(out + 999);
-  EXPECT_THAT(all(lines), ElementsAre(std::string(999, 'x')));
+  lines.add("first");
+  lines.rows(3, 1000, [](char *out, std::size_t i) { return std::fill_n(out, i * 500, static_cast<char>('x' + i)); });
+  lines.rows(0, 1000, [](char *out, std::size_t) { return out + 1; });
+  lines.add("last");
+  EXPECT_THAT(all(lines), ElementsAre("first", "", std::string(500, 'y'), std::string(1000, 'z'), "last"));
+  EXPECT_EQ(lines.text().substr(0, 9), "first\n\nyy");
+}
+
+TEST(DisplayLines, RowsGrowWhatOtherRowsHaveFilled) {
+  DisplayLines lines(2, 10);
+  for (unsigned round = 0; round < 5; ++round)
+    lines.rows(100, 4, [&](char *out, std::size_t i) { return vesk::Format<"%x">::write(out, std::uint32_t(i)); });
+  ASSERT_EQ(lines.size(), 500u);
+  EXPECT_EQ(lines[99], "63");
+  EXPECT_EQ(lines[100], "0");
+  EXPECT_EQ(lines[499], "63");
 }
 
 TEST(DisplayLines, MoveLeavesAnEmptyListThatCanBeUsed) {
