@@ -17,7 +17,7 @@ void Batch::add(const SourceReport &report, bool first) {
   steps_.emplace_back(copy);
 }
 
-void Batch::run(ReportPrinter &printer) {
+void Batch::run(ReportPrinter &printer, OutputBuffer &output) {
   for (auto &step : steps_) {
     if (auto *event = std::get_if<Event>(&step)) {
       events_.push_back(std::move(*event));
@@ -25,7 +25,7 @@ void Batch::run(ReportPrinter &printer) {
     }
     auto &[source, begin, first] = std::get<Report>(step);
     source.bytes = bytes_.text().substr(begin, source.bytes.size());
-    printer.print(source, first, output_, messages_);
+    printer.print(source, first, output, messages_);
     for (Message &message : messages_) events_.emplace_back(std::move(message));
     messages_.clear();
   }
@@ -35,7 +35,6 @@ void Batch::clear() {
   steps_.clear();
   bytes_.clear();
   names_.clear();
-  output_.clear();
   events_.clear();
 }
 

@@ -20,16 +20,15 @@ class Batch {
   using Event = std::variant<Message, FileEnd>;
 
   /// So much that handing it on costs nothing, so little that a few of them are no memory: a report makes up to 18 kB.
-  static constexpr std::size_t kMostReports = 64;
+  static constexpr std::size_t kMostReports = 32;
 
   bool isFull() const { return steps_.size() >= kMostReports || bytes_.size() >= kMostBytes; }
   bool isEmpty() const { return steps_.empty(); }
   void add(const SourceReport &report, bool first);
   void add(Event event) { steps_.emplace_back(std::move(event)); }
 
-  /// Decodes everything; afterwards output() and events() are what is to be written and told, in order.
-  void run(ReportPrinter &printer);
-  const OutputBuffer &output() const { return output_; }
+  /// Decodes everything; afterwards `output` and events() are what is to be written and told, in order.
+  void run(ReportPrinter &printer, OutputBuffer &output);
   std::vector<Event> &events() { return events_; }
   /// Makes it empty, and keeps its memory.
   void clear();
@@ -48,7 +47,6 @@ class Batch {
   std::vector<std::variant<Report, Event>> steps_;
   OutputBuffer bytes_;
   std::deque<std::string> names_;  // of files and devices; a deque, because views of them are kept
-  OutputBuffer output_;
   std::vector<Event> events_;
   std::vector<Message> messages_;
 };

@@ -22,7 +22,7 @@ Pipeline::Pipeline(const Options &options, const Filter &filter, Formatter &form
   if (options.jobs < 2 || options.flushEachReport || !formatter.isStateless()) return;
   workers_ = std::make_unique<Workers>(
       options.jobs, [this] { return std::make_unique<ReportPrinter>(formatter_, options_.decimal, options_.lenient); },
-      [this](Batch &batch) { deliver(batch); });
+      [this](Batch &batch, std::string_view text) { deliver(batch, text); });
   batch_ = workers_->take();
 }
 
@@ -81,7 +81,7 @@ void Pipeline::addToBatch(Step &&...step) {
   batch_ = workers_->take();
 }
 
-void Pipeline::deliver(Batch &batch) {
+void Pipeline::deliver(Batch &batch, std::string_view output) {
   for (Batch::Event &event : batch.events()) {
     if (auto *message = std::get_if<Message>(&event))
       messages_.add(std::move(*message));
@@ -89,7 +89,7 @@ void Pipeline::deliver(Batch &batch) {
       messages_.finishFile(std::get<Batch::FileEnd>(event).file);
   }
   if (buffer_.size() != 0) flush();  // what begin() has left there
-  output_.write(batch.output().text());
+  output_.write(output);
 }
 
 void Pipeline::finish() {

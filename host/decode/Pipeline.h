@@ -43,7 +43,7 @@ class Pipeline : public ReadSink {
   void countLoss(const SourceReport &report);
   template <class... Step>
   void addToBatch(Step &&...step);
-  void deliver(Batch &batch);
+  void deliver(Batch &batch, std::string_view output);
   void flush();
 
   Options options_;

@@ -14,13 +14,12 @@ constexpr unsigned kBatchesEach = 3;
 
 Workers::Workers(unsigned count, const MakePrinter &makePrinter, Deliver deliver) : deliver_(std::move(deliver)) {
   for (unsigned i = 0; i < count * kBatchesEach + 1; ++i) spare_.push_back(std::make_unique<Batch>());
-  for (unsigned i = 0; i < count; ++i) printers_.push_back(makePrinter());
-  threads_.reserve(count);
-  for (const auto &printer : printers_) {
+  for (unsigned i = 0; i < count; ++i) hands_.push_back({makePrinter(), {}});
+  threads_.reserve(count - 1);
+  for (unsigned i = 1; i < count; ++i) {
     try {
-      threads_.emplace_back([this, &printer] { work(*printer); });
+      threads_.emplace_back([this, i] { work(hands_[i]); });
     } catch (const std::system_error &) {
-      if (threads_.empty()) throw;
       break;  // the machine has no more to give; those that run do all the work
     }
   }
@@ -39,10 +38,20 @@ void Workers::rethrow() {
   if (failure_) std::rethrow_exception(failure_);
 }
 
+template <class Condition>
+void Workers::helpUntil(std::unique_lock<std::mutex> &lock, Condition condition) {
+  while (!failure_ && !condition()) {
+    if (waiting_.empty())
+      changed_.wait(lock);
+    else
+      runNext(lock, hands_.front());
+  }
+  rethrow();
+}
+
 std::unique_ptr<Batch> Workers::take() {
   std::unique_lock lock(mutex_);
-  changed_.wait(lock, [this] { return failure_ || !spare_.empty(); });
-  rethrow();
+  helpUntil(lock, [this] { return !spare_.empty(); });
   auto batch = std::move(spare_.back());
   spare_.pop_back();
   return batch;
@@ -58,50 +67,61 @@ void Workers::put(std::unique_ptr<Batch> batch) {
 
 void Workers::drain() {
   std::unique_lock lock(mutex_);
-  changed_.wait(lock, [this] { return failure_ || (nextOut_ == nextIn_ && !delivering_); });
-  rethrow();
+  helpUntil(lock, [this] { return nextOut_ == nextIn_ && !delivering_; });
 }
 
-void Workers::work(ReportPrinter &printer) {
+void Workers::work(Hand &hand) {
   std::unique_lock lock(mutex_);
   for (;;) {
     changed_.wait(lock, [this] { return stopping_ || failure_ || !waiting_.empty(); });
     if (stopping_ || failure_) return;
-    auto [number, batch] = std::move(waiting_.front());
-    waiting_.pop_front();
-    lock.unlock();
-    std::exception_ptr failure;
-    try {
-      batch->run(printer);
-    } catch (...) {
-      failure = std::current_exception();
-    }
-    lock.lock();
-    if (failure) failure_ = failure;
-    done_.emplace(number, std::move(batch));
-    deliverInOrder(lock);
-    changed_.notify_all();
+    runNext(lock, hand);
   }
+}
+
+void Workers::runNext(std::unique_lock<std::mutex> &lock, Hand &hand) {
+  auto [number, batch] = std::move(waiting_.front());
+  waiting_.pop_front();
+  std::unique_ptr<OutputBuffer> output;
+  if (!hand.outputs.empty()) {
+    output = std::move(hand.outputs.back());
+    hand.outputs.pop_back();
+  }
+  lock.unlock();
+  std::exception_ptr failure;
+  try {
+    if (!output) output = std::make_unique<OutputBuffer>();
+    batch->run(*hand.printer, *output);
+  } catch (...) {
+    failure = std::current_exception();
+  }
+  lock.lock();
+  if (failure) failure_ = failure;
+  done_.emplace(number, Done{std::move(batch), std::move(output), &hand});
+  deliverInOrder(lock);
+  changed_.notify_all();
 }
 
 void Workers::deliverInOrder(std::unique_lock<std::mutex> &lock) {
   if (delivering_) return;  // whoever delivers finds this batch too
   delivering_ = true;
   while (!failure_ && !done_.empty() && done_.begin()->first == nextOut_) {
-    auto batch = std::move(done_.begin()->second);
+    Done done = std::move(done_.begin()->second);
     done_.erase(done_.begin());
     lock.unlock();
     std::exception_ptr failure;
     try {
-      deliver_(*batch);
-      batch->clear();
+      deliver_(*done.batch, done.output->text());
+      done.batch->clear();
+      done.output->clear();
     } catch (...) {
       failure = std::current_exception();
     }
     lock.lock();
     if (failure) failure_ = failure;
     ++nextOut_;
-    spare_.push_back(std::move(batch));
+    done.hand->outputs.push_back(std::move(done.output));
+    spare_.push_back(std::move(done.batch));
     changed_.notify_all();
   }
   delivering_ = false;
