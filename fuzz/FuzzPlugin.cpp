@@ -99,7 +99,7 @@ void checkExtendedVersion(const std::string &text, const Outcome &lines, const O
   std::string_view rest = text;
   for (const char *key : {"PROJECT", "SDK", "TOOLCHAIN", "KORVO", "VENDOR", "ALGS"}) {
     const std::size_t end = rest.find('\n');
-    check(value.value().at(std::string_view(key)).as<std::string>() == rest.substr(0, end), key);
+    check(value.value().at(std::string_view(key)).as<vesk::Text>() == rest.substr(0, end), key);
     rest.remove_prefix(end + 1);
   }
 }
@@ -115,7 +115,7 @@ void checkVersion(const Call &call, const PaddedReport &report, const Outcome &l
   if (extended) return checkExtendedVersion(text, lines, value);
   checkSame(lines.lines(), text, "the version's line");
   check(std::get<DisplayLines>(lines.result).size() == 1, "one line, whatever line feeds it holds");
-  check(value.value().as<std::string>() + "\n" == text, "the version's string");
+  check(std::string(value.value().as<vesk::Text>().view()) + "\n" == text, "the version's string");
 }
 
 void checkReport(const PaddedReport &report, const Call &call) {

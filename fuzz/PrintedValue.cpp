@@ -26,11 +26,11 @@ class Printer {
   }
   std::string take() { return std::move(text_); }
 
-  void version() { line("%s", value_.as<std::string>().c_str()); }
+  void version() { line("%s", std::string(value_.as<vesk::Text>().view()).c_str()); }
   void image();
   void packet();
   void dumpConfig();
-  void dumpState() { line("ADC Dump State: %s", value_.as<std::string>().c_str()); }
+  void dumpState() { line("ADC Dump State: %s", std::string(value_.as<vesk::Text>().view()).c_str()); }
   void summary();
   void fullReport();
   void configuration();
@@ -90,7 +90,7 @@ void Printer::mask(const char *label, std::uint64_t mask) {
 
 void Printer::option(const char *label, bool isGlobal, const ReportValue &option) {
   const int bits = option.at(std::string_view("OPTIONS_RAW")).as<std::int32_t>();
-  const char *level = option.at(std::string_view("ERROR_LEVEL")).as<std::string>().c_str();
+  const std::string level(option.at(std::string_view("ERROR_LEVEL")).as<vesk::Text>().view());
   const char *gpio[] = {"", "GPIO_0 ", "GPIO_1 ", "GPIO_2 "};
   const char *masked = (bits & 0x08) != 0 ? "MASKED " : "", *message = (bits & 0x40) != 0 ? "MESSAGE " : "",
              *breakpoint = (bits & 0x80) != 0 ? "BREAKPOINT " : "",
@@ -98,7 +98,7 @@ void Printer::option(const char *label, bool isGlobal, const ReportValue &option
   if (isGlobal)
     line("%40s:  %s%s%s%s%s", label, masked, message, gpio[bits / 16 % 4], breakpoint, none);
   else
-    line("%40s: %s %s%s%s%s%s", label, level, masked, message, gpio[bits / 16 % 4], breakpoint, none);
+    line("%40s: %s %s%s%s%s%s", label, level.c_str(), masked, message, gpio[bits / 16 % 4], breakpoint, none);
 }
 
 void Printer::image() {
@@ -137,7 +137,7 @@ void Printer::dumpConfig() {
   line("Channel Enable Mask = %04x%08x", static_cast<unsigned>(channels >> 32), static_cast<unsigned>(channels));
   line("Sample Count        = %u", u32("SAMPLE_COUNT"));
   line("Stim Timer Compare  = %u", u32("STIM_TIMER_COMPARE"));
-  line("Trigger Source      = %s", get<std::string>("TRIGGER_SOURCE").c_str());
+  line("Trigger Source      = %s", std::string(get<vesk::Text>("TRIGGER_SOURCE").view()).c_str());
 }
 
 void Printer::summary() {

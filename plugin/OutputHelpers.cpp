@@ -62,12 +62,18 @@ void addLinesByPrintf(DisplayLines &lines, const void *data, std::uint32_t count
 }
 #pragma GCC diagnostic pop
 
+/// Compares without a call, for a report asks four times.
+bool isFormat(const char *format, std::string_view known) {
+  for (const char c : known)
+    if (*format++ != c) return false;
+  return *format == '\0';
+}
+
 template <class Field>
 void addIntegers(DisplayLines &lines, const void *data, std::uint32_t count, const char *format) {
-  const std::string_view text = format;
-  if (text == "%08x ")
+  if (isFormat(format, "%08x "))
     addHexLines<Field>(lines, data, count);
-  else if (text == "%14d ")
+  else if (isFormat(format, "%14d "))
     addLinesAs<"%14d ", Field>(lines, data, count);
   else
     addLinesByPrintf<Field, typename Field::value_type>(lines, data, count, format);
@@ -94,7 +100,7 @@ void HIDReportVeskPlugin::addArrayInt32(DisplayLines &lines, const void *data, s
 
 void HIDReportVeskPlugin::addArrayFloat(DisplayLines &lines, const void *data, std::uint32_t dataLength,
                                         const char *format) const {
-  if (std::string_view(format) == "% -13.3f ")
+  if (vesk::isFormat(format, "% -13.3f "))
     vesk::addLinesAs<"% -13.3f ", vesk::F32>(lines, data, dataLength);
   else
     vesk::addLinesByPrintf<vesk::F32, double>(lines, data, dataLength, format);

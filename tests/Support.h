@@ -98,8 +98,8 @@ inline std::string leaf(double v) {
 inline std::string leaf(bool v) {
   return v ? "bool true" : "bool false";
 }
-inline std::string leaf(const std::string &v) {
-  return "string " + v;
+inline std::string leaf(const vesk::Text &v) {
+  return "string " + std::string(v.view());
 }
 
 template <class T>

@@ -166,7 +166,8 @@ template <Conversion C, class T>
     return writeAlignedDecimal<C.width>(out, negative, magnitude);
   } else {
     char *first = out;
-    if (negative) [[unlikely]] *first++ = '-';
+    if (negative) [[unlikely]]
+      *first++ = '-';
     return alignRight(out, writeDecimal(first, magnitude), C.width);
   }
 }

@@ -20,7 +20,7 @@ inline constexpr bool kIsArray<std::vector<T>> = true;
 
 /// The alternatives from here on hold memory.
 constexpr std::size_t kFirstOwner = 9;
-static_assert(std::is_same_v<std::variant_alternative_t<kFirstOwner, ReportValue::Variant>, std::string>);
+static_assert(std::is_same_v<std::variant_alternative_t<kFirstOwner, ReportValue::Variant>, Text>);
 
 bool same(float a, float b) noexcept {
   return std::bit_cast<std::uint32_t>(a) == std::bit_cast<std::uint32_t>(b);
@@ -90,8 +90,8 @@ void printText(std::ostream &out, std::string_view text) {
 
 template <class T>
 void print(std::ostream &out, const T &value) {
-  if constexpr (std::is_same_v<T, std::string>) {
-    printText(out, value);
+  if constexpr (std::is_same_v<T, Text>) {
+    printText(out, value.view());
   } else if constexpr (kIsArray<T>) {
     out << typeName<typename T::value_type>() << '[';
     for (std::size_t i = 0; i < value.size(); ++i) {
@@ -122,16 +122,6 @@ Dictionary::Dictionary(std::size_t entries, std::size_t nestedEntries)
       room_(static_cast<std::uint32_t>(nestedEntries)),
       owns_(true) {}
 
-void Dictionary::takeRoomOf(Dictionary &outer, std::size_t entries) {
-  if (entries > outer.room_) {
-    *this = Dictionary(entries);
-    return;
-  }
-  outer.room_ -= static_cast<std::uint32_t>(entries);
-  entries_ = outer.entries_ + outer.capacity_ + outer.room_;
-  capacity_ = static_cast<std::uint32_t>(entries);
-}
-
 Dictionary::Dictionary(Dictionary &&other) noexcept {
   steal(other);
 }
@@ -155,21 +145,22 @@ void Dictionary::steal(Dictionary &other) noexcept {
   owns_ = std::exchange(other.owns_, false);
 }
 
+/// Whether there is nothing to give back, as with most entries.
+bool Dictionary::holdsNoMemory(const Entry &entry) noexcept {
+  const ReportValue::Variant &value = entry.value.variant();
+  if (value.index() < kFirstOwner) return true;
+  const auto *text = std::get_if<Text>(&value);
+  return text != nullptr && text->isConstant();
+}
+
 void Dictionary::release() noexcept {
-  // A number has nothing to give back, and most entries are numbers.
   for (Entry *entry = entries_; entry != entries_ + size_; ++entry)
-    if (entry->value.variant().index() >= kFirstOwner) std::destroy_at(entry);
+    if (!holdsNoMemory(*entry)) std::destroy_at(entry);
   if (owns_) ::operator delete(entries_);
 }
 
 void Dictionary::throwFull() {
   throw std::length_error("vesk::Dictionary: more entries than it was given room for");
-}
-
-EntryAdder Dictionary::addDictionary(Key key, std::size_t entries) {
-  Dictionary &nested = emplace(key, std::in_place_type<Dictionary>, Dictionary()).value.nested();
-  nested.takeRoomOf(*this, entries);
-  return nested;
 }
 
 const ReportValue *Dictionary::find(std::string_view key) const noexcept {

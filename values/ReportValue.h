@@ -1,4 +1,4 @@
-// The value tree of one report: numbers that keep their width and signedness, strings, number arrays, dictionaries.
+// The value tree of one report: numbers that keep their width and signedness, texts, number arrays, dictionaries.
 #pragma once
 
 #include <cstddef>
@@ -12,25 +12,11 @@
 #include <variant>
 #include <vector>
 
+#include "values/Text.h"
+
 class ReportValue;
 
 namespace vesk {
-
-/// A dictionary key: a view of a string literal, made by the compiler, so that it costs nothing and always lives. It is
-/// printable ASCII without quotes and backslashes, so that whoever writes it need not look for something to escape.
-class Key {
- public:
-  template <std::size_t Size>
-  consteval Key(const char (&literal)[Size]) : text_(literal, Size - 1) {  // NOLINT: implicit, like a string_view
-    for (const char c : text_)
-      if (c < ' ' || c > '~' || c == '"' || c == '\\') throw "a key that would have to be escaped";
-  }
-
-  constexpr std::string_view text() const noexcept { return text_; }
-
- private:
-  std::string_view text_;
-};
 
 struct Entry;
 class EntryAdder;
@@ -52,8 +38,6 @@ class Dictionary {
   /// Adds a value, a ReportValue or exactly one of its types; std::length_error when the room is used up.
   template <class T>
   void add(Key key, T value);
-  /// Adds a string, made in place: a string's move costs as much as the string.
-  void addText(Key key, std::string_view text);
   /// Adds an empty dictionary with room for `entries`. What it returns is good as long as this dictionary is.
   EntryAdder addDictionary(Key key, std::size_t entries);
 
@@ -66,10 +50,21 @@ class Dictionary {
 
  private:
   friend class ::ReportValue;
+  /// Entries that belong to an outer dictionary.
+  struct Room {
+    Entry *entries;
+    std::uint32_t capacity;
+  };
+
+ public:
+  explicit Dictionary(Room room) noexcept : entries_(room.entries), capacity_(room.capacity) {}  // of addDictionary()
+
+ private:
   template <class... Args>
   Entry &emplace(Key key, Args &&...args);
-  void takeRoomOf(Dictionary &outer, std::size_t entries);
+  Room dealOut(std::size_t entries) noexcept;
   void steal(Dictionary &other) noexcept;
+  static bool holdsNoMemory(const Entry &entry) noexcept;
   void release() noexcept;
   [[noreturn]] static void throwFull();
 
@@ -88,7 +83,6 @@ class EntryAdder {
 
   template <class T>
   void add(Key key, T value);
-  void addText(Key key, std::string_view text) { dictionary_.addText(key, text); }
   EntryAdder addDictionary(Key key, std::size_t entries) { return dictionary_.addDictionary(key, entries); }
 
  private:
@@ -106,7 +100,7 @@ inline constexpr bool kIsAlternative<T, std::variant<Alternatives...>> = (std::i
 class ReportValue {
  public:
   using Variant = std::variant<std::uint8_t, std::uint16_t, std::uint32_t, std::uint64_t, std::int32_t, std::int64_t,
-                               float, double, bool, std::string, std::vector<std::uint32_t>, std::vector<std::int32_t>,
+                               float, double, bool, vesk::Text, std::vector<std::uint32_t>, std::vector<std::int32_t>,
                                std::vector<float>, vesk::Dictionary>;
 
   template <class T>
@@ -200,13 +194,20 @@ void Dictionary::add(Key key, T value) {
     emplace(key, std::in_place_type<T>, std::move(value));
 }
 
+inline Dictionary::Room Dictionary::dealOut(std::size_t entries) noexcept {
+  room_ -= static_cast<std::uint32_t>(entries);
+  return {entries_ + capacity_ + room_, static_cast<std::uint32_t>(entries)};
+}
+
+inline EntryAdder Dictionary::addDictionary(Key key, std::size_t entries) {
+  constexpr std::in_place_type_t<Dictionary> kType;
+  Entry &entry = entries <= room_ ? emplace(key, kType, dealOut(entries)) : emplace(key, kType, Dictionary(entries));
+  return entry.value.nested();
+}
+
 template <class T>
 void EntryAdder::add(Key key, T value) {
   dictionary_.add(key, std::move(value));
-}
-
-inline void Dictionary::addText(Key key, std::string_view text) {
-  emplace(key, std::in_place_type<std::string>, text);
 }
 
 }  // namespace vesk

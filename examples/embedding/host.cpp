@@ -19,8 +19,8 @@ void show(const ReportValue &value, const std::string &path) {
                                  : value.is<std::uint16_t>() ? value.as<std::uint16_t>()
                                                              : value.as<std::uint32_t>();
     std::printf("%s = %lu\n", path.c_str(), number);
-  } else if (value.is<std::string>()) {
-    std::printf("%s = \"%s\"\n", path.c_str(), value.as<std::string>().c_str());
+  } else if (value.is<vesk::Text>()) {
+    std::printf("%s = \"%s\"\n", path.c_str(), std::string(value.as<vesk::Text>().view()).c_str());
   } else if (value.size() != 0) {
     std::printf("%s: %zu numbers\n", path.c_str(), value.size());
   } else {

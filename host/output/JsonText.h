@@ -4,13 +4,33 @@
 #include <charconv>
 #include <cmath>
 #include <cstdint>
+#include <cstring>
 #include <string>
 #include <string_view>
+#include <type_traits>
 
 #include "host/output/OutputBuffer.h"
 #include "values/NumberText.h"
 
 namespace vesk::host {
+
+/// Copies a text of some four to thirty bytes, as keys are, without a call; returns the end of the copy. Two pieces
+/// that overlap make all lengths between their own and twice that one case, so that few branches are guessed wrong.
+inline char *copyShort(char *out, std::string_view text) {
+  const auto pieces = [&](auto size) {
+    std::memcpy(out, text.data(), size);
+    std::memcpy(out + text.size() - size, text.data() + text.size() - size, size);
+  };
+  if (text.size() > 16 && text.size() <= 32)
+    pieces(std::integral_constant<std::size_t, 16>());
+  else if (text.size() > 8 && text.size() <= 16)
+    pieces(std::integral_constant<std::size_t, 8>());
+  else if (text.size() >= 4 && text.size() <= 8)
+    pieces(std::integral_constant<std::size_t, 4>());
+  else
+    std::copy(text.begin(), text.end(), out);
+  return out + text.size();
+}
 
 /// The text with U+FFFD in place of every byte that is not part of well-formed UTF-8.
 std::string asUtf8(std::string_view text);

@@ -19,6 +19,14 @@ class OutputBuffer {
     if (capacity_ - size_ < bytes) grow(bytes);
     return bytes_.get() + size_;
   }
+  /// The same behind `end`, up to where the room that was taken is filled already; returns where that lies now.
+  char *room(char *end, std::size_t bytes) {
+    if (static_cast<std::size_t>(bytes_.get() + capacity_ - end) < bytes) {
+      advanceTo(end);
+      end = room(bytes);
+    }
+    return end;
+  }
   void advanceTo(const char *end) { size_ = static_cast<std::size_t>(end - bytes_.get()); }
 
   void append(std::string_view text) {

@@ -12,13 +12,29 @@
 
 namespace vesk::host {
 
+namespace {
+
+/// Makes a pipe hold several writes, so that its reader works while we do. Where that is refused, or the output is no
+/// pipe, it stays as it is.
+void widenPipe(int fd) {
+  constexpr int kPipeBytes = 1 << 20;  // what Linux lets anybody have
+  const int bytes = ::fcntl(fd, F_GETPIPE_SZ);
+  if (bytes > 0 && bytes < kPipeBytes) ::fcntl(fd, F_SETPIPE_SZ, kPipeBytes);
+}
+
+}  // namespace
+
 OutputFile::OutputFile(const std::string &path) : name_(path == "-" ? "(standard output)" : path) {
-  if (path == "-") return;
+  if (path == "-") {
+    widenPipe(fd_);
+    return;
+  }
   struct stat existing {};
   // What is there and no regular file (a device, a FIFO) cannot be replaced and is written to as it is.
   if (::stat(path.c_str(), &existing) == 0 && !S_ISREG(existing.st_mode)) {
     fd_ = ::open(path.c_str(), O_WRONLY | O_CLOEXEC);
     if (fd_ < 0) fail("cannot be opened");
+    widenPipe(fd_);
     return;
   }
   path_ = path;

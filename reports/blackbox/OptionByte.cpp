@@ -25,7 +25,7 @@ constexpr FlagText flagText(unsigned option) {
 constexpr std::array<TextBlock<16>, kLevelMask + 1> kLevelTexts = [] {
   std::array<TextBlock<16>, kLevelMask + 1> texts;
   for (std::uint8_t level = 0; level < texts.size(); ++level) {
-    texts[level].append(levelName(level));
+    texts[level].append(levelName(level).text());
     texts[level].append(" ");
   }
   return texts;
@@ -37,15 +37,10 @@ constexpr std::array<FlagText, 32> kFlagTexts = [] {
   return texts;
 }();
 
-void addOption(EntryAdder out, std::uint8_t option) {
-  out.addText("ERROR_LEVEL", levelName(option & kLevelMask));
-  out.add("OPTIONS_RAW", i32(option));  // whole: a consumer takes the flags out of it
-}
-
 }  // namespace vesk
 
 void HIDReportVeskPlugin::errorLevelToString(std::uint8_t level, const char **levelStr) const {
-  *levelStr = vesk::levelName(level).data();  // of a literal, so a zero ends it
+  *levelStr = vesk::levelName(level).text().data();  // of a literal, so a zero ends it
 }
 
 std::string HIDReportVeskPlugin::blackBoxOptionToString(std::uint8_t option, const char *eventName,

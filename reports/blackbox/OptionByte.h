@@ -12,10 +12,11 @@ namespace vesk {
 
 constexpr std::uint8_t kLevelMask = 0x07;
 
+inline constexpr Key kLevelNames[] = {"TRACE", "DEBUG", "INFO", "WARNING", "ERROR", "CRITICAL", "UNKNOWN"};
+
 /// "TRACE" to "CRITICAL" for 0 to 5, "UNKNOWN" for all others.
-constexpr std::string_view levelName(std::uint8_t level) {
-  constexpr std::string_view kNames[] = {"TRACE", "DEBUG", "INFO", "WARNING", "ERROR", "CRITICAL"};
-  return level > 5 ? "UNKNOWN" : kNames[level];
+constexpr Key levelName(std::uint8_t level) {
+  return kLevelNames[level < 6 ? level : 6];
 }
 
 /// levelName() and a blank, for the rows that are printed most.
@@ -27,6 +28,9 @@ using FlagText = TextBlock<40>;
 extern const std::array<FlagText, 32> kFlagTexts;
 
 /// Fills a dictionary that has room for two entries.
-void addOption(EntryAdder out, std::uint8_t option);
+inline void addOption(EntryAdder out, std::uint8_t option) {
+  out.add("ERROR_LEVEL", Text(levelName(option & kLevelMask)));
+  out.add("OPTIONS_RAW", i32(option));  // whole: a consumer takes the flags out of it
+}
 
 }  // namespace vesk

@@ -24,7 +24,7 @@ std::uint8_t isPresent(const Layout &r, ModuleIndex module) {
 DisplayLines toLines(const Layout &r) {
   DisplayLines out(26, 2048);
   out.add("--Black Box Summary--");
-  out.line<"Severity Level: %s">(levelName(r.severity & kLevelMask));
+  out.line<"Severity Level: %s">(levelName(r.severity & kLevelMask).text());
   out.line<"Module Count:   %i">(r.moduleCount);
   out.add("");
   for (const ModuleIndex module : kSummaryOrder)

@@ -43,11 +43,11 @@ std::int32_t magicValue(const Packet &r) {
   return r.magic[0] << 2 | r.magic[1] << 1 | r.magic[2];
 }
 
-const char *triggerName(const Config &r) {
-  return r.triggerSource == 0 ? "RX_EN" : "STIM_TIMER";
+Key triggerName(const Config &r) {
+  return r.triggerSource == 0 ? Key("RX_EN") : Key("STIM_TIMER");
 }
 
-const char *stateName(const State &r) {
+Key stateName(const State &r) {
   switch (r.state) {
     case 0:
       return "STANDBY";
@@ -90,7 +90,7 @@ DisplayLines toLines(const Config &r) {
   out.line<"Channel Enable Mask = %04x%08x">(r.channelMaskHigh, r.channelMaskLow);
   out.line<"Sample Count        = %u">(r.sampleCount);
   out.line<"Stim Timer Compare  = %u">(r.stimTimerCompare);
-  out.line<"Trigger Source      = %s">(triggerName(r));
+  out.line<"Trigger Source      = %s">(triggerName(r).text());
   return out;
 }
 
@@ -100,18 +100,18 @@ ReportValue toValue(const Config &r) {
   out.add("CHANNEL_ENABLE_MASK", u64(u64(r.channelMaskHigh) << 32 | r.channelMaskLow));
   out.add("SAMPLE_COUNT", u32(r.sampleCount));
   out.add("STIM_TIMER_COMPARE", u32(r.stimTimerCompare));
-  out.add("TRIGGER_SOURCE", std::string(triggerName(r)));
+  out.add("TRIGGER_SOURCE", Text(triggerName(r)));
   return ReportValue(std::move(out));
 }
 
 DisplayLines toLines(const State &r) {
   DisplayLines out(1, 64);
-  out.line<"ADC Dump State: %s">(stateName(r));
+  out.line<"ADC Dump State: %s">(stateName(r).text());
   return out;
 }
 
 ReportValue toValue(const State &r) {
-  return ReportValue(std::string(stateName(r)));
+  return ReportValue(Text(stateName(r)));
 }
 
 }  // namespace

@@ -60,7 +60,7 @@ ReportValue toComponents(std::string_view version) {
   LineTaker lines(version);
   for (const Key component : kComponents) {
     if (!lines.hasMore()) throw std::out_of_range("HIDReportVeskPlugin: the extended version has fewer than six lines");
-    out.add(component, std::string(lines.take()));
+    out.add(component, Text(lines.take()));
   }
   return ReportValue(std::move(out));
 }
@@ -75,7 +75,7 @@ ReportResult HIDReportVeskPlugin::parseVersion() const {
     return vesk::toLines(*version);
   }
   if (!version) return {};
-  return ReportValue(std::string(*version));
+  return ReportValue(vesk::Text(*version));
 }
 
 ReportResult HIDReportVeskPlugin::parseVersionExtended() const {

@@ -9,6 +9,7 @@ namespace {
 
 using namespace vesk::host;
 using vesk::Dictionary;
+using vesk::Text;
 
 struct Written {
   std::string value;
@@ -40,7 +41,7 @@ TEST(JsonValue, dictionariesKeepTheirOrderAndNesting) {
   tree.add("Z", std::uint16_t{5});
   auto &&inner = tree.addDictionary("INNER", 2);
   inner.add("INIT time ms", std::uint32_t{1});
-  inner.add("b", std::string("x\ny"));
+  inner.add("b", Text(std::string_view("x\ny")));
   tree.add("A", std::vector<std::int32_t>{-1, 0, 1});
   EXPECT_EQ(written(ReportValue(std::move(tree))),
             (Written{R"({"Z":5,"INNER":{"INIT time ms":1,"b":"x\ny"},"A":[-1,0,1]})", ""}));

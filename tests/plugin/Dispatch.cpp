@@ -260,8 +260,8 @@ TEST_F(Dispatch, TablesCanBeSet) {
   plugin->setReportIds({{1, "parseAdcDumpState"}});
   plugin->setInputReportIds({{2, "parseWatchDogReport"}, {0x1234, "parseAdcDumpState"}});
   const std::string bytes("\x01\x02", 2);
-  EXPECT_EQ(std::get<ReportValue>(object(bytes, 1, 2)).as<std::string>(), "CONTINUOUS");
-  EXPECT_EQ(std::get<ReportValue>(object(bytes, 0x1234, 0)).as<std::string>(), "CONTINUOUS");
+  EXPECT_EQ(std::get<ReportValue>(object(bytes, 1, 2)).as<vesk::Text>(), "CONTINUOUS");
+  EXPECT_EQ(std::get<ReportValue>(object(bytes, 0x1234, 0)).as<vesk::Text>(), "CONTINUOUS");
   EXPECT_EQ(std::get<ReportValue>(object(bytes, 2, 0)).size(), 6u);
   EXPECT_TRUE(isNothing(object(bytes, 0xD0, 2)));
   EXPECT_TRUE(isNothing(object(bytes, 0x76, 0)));
@@ -295,7 +295,7 @@ TEST_F(Dispatch, ResultOutlivesTheReport) {
                               0xD0, 2);
   padded.assign(std::string(1023, '\xFF'));
   plugin.reset();
-  EXPECT_EQ(std::get<ReportValue>(value).as<std::string>(), "version");
+  EXPECT_EQ(std::get<ReportValue>(value).as<vesk::Text>(), "version");
   EXPECT_THAT(test::linesOf(lines), ElementsAre("version"));
 }
 

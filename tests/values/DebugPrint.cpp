@@ -14,9 +14,9 @@ std::string printed(const ReportValue &value) {
 }
 
 TEST(DebugPrint, TextsAreEscaped) {
-  EXPECT_EQ(printed(ReportValue(std::string("a\"b\\c"))), R"("a\"b\\c")");
-  EXPECT_EQ(printed(ReportValue(std::string("\n\x1f\x7f ~"))), R"("\x0a\x1f\x7f ~")");
-  EXPECT_EQ(printed(ReportValue(std::string("\xC3\xA4"))), "\"\xC3\xA4\"");
+  EXPECT_EQ(printed(ReportValue(vesk::Text(std::string_view("a\"b\\c")))), R"("a\"b\\c")");
+  EXPECT_EQ(printed(ReportValue(vesk::Text(std::string_view("\n\x1f\x7f ~")))), R"("\x0a\x1f\x7f ~")");
+  EXPECT_EQ(printed(ReportValue(vesk::Text(std::string_view("\xC3\xA4")))), "\"\xC3\xA4\"");
 }
 
 }  // namespace

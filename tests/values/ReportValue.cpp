@@ -14,6 +14,7 @@ namespace {
 using testing::ElementsAre;
 using vesk::Dictionary;
 using vesk::EntryAdder;
+using vesk::Text;
 using vesk::u16;
 using vesk::u32;
 using vesk::u8;
@@ -60,7 +61,8 @@ TEST(ReportValue, KeepsWidthAndSignedness) {
   expectKeeps<float>(36.5f);
   expectKeeps<double>(1250999.875);
   expectKeeps<bool>(true);
-  expectKeeps<std::string>("RX_EN");
+  expectKeeps<Text>(Text(vesk::Key("RX_EN")));
+  expectKeeps<Text>(Text(std::string("RX_EN")));
   EXPECT_THROW(value(u8(1)).as<std::uint16_t>(), std::bad_variant_access);
 }
 
@@ -110,7 +112,7 @@ TEST(ReportValue, ArraysByIndex) {
 ReportValue sample() {
   Dictionary d(3);
   d.add("Count", u32(7));
-  d.add("Name", std::string("x"));
+  d.add("Name", Text(std::string("x")));
   d.add("List", std::vector<std::int32_t>{1, -2});
   return ReportValue(std::move(d));
 }
@@ -163,7 +165,7 @@ ReportValue nested() {
   for (int i = 0; i < 2; ++i) {
     EntryAdder inner = i == 0 ? outer.addDictionary("P", 2) : outer.addDictionary("Q", 2);
     inner.add("A", u32(static_cast<std::uint32_t>(i)));
-    inner.add("T", std::string(40, static_cast<char>('a' + i)));
+    inner.add("T", Text(std::string(40, static_cast<char>('a' + i))));
   }
   EntryAdder own = outer.addDictionary("R", 1);
   own.add("A", std::vector<float>{1, 2, 3});
@@ -175,8 +177,8 @@ TEST(Dictionary, NestedDictionariesFillTheOuterRoomAndThenTheirOwn) {
   EXPECT_THAT(keys(v.as<Dictionary>()), ElementsAre("N", "P", "Q", "R"));
   EXPECT_EQ(v.at("P").at("A").as<std::uint32_t>(), 0u);
   EXPECT_EQ(v.at("Q").at("A").as<std::uint32_t>(), 1u);
-  EXPECT_EQ(v.at("P").at("T").as<std::string>(), std::string(40, 'a'));
-  EXPECT_EQ(v.at("Q").at("T").as<std::string>(), std::string(40, 'b'));
+  EXPECT_EQ(v.at("P").at("T").as<vesk::Text>(), std::string(40, 'a'));
+  EXPECT_EQ(v.at("Q").at("T").as<vesk::Text>(), std::string(40, 'b'));
   EXPECT_EQ(v.at("R").at("A").size(), 3u);
 }
 
@@ -198,14 +200,14 @@ TEST(Dictionary, NestedDictionariesMoveWithTheirTree) {
   Dictionary outer(1, 3);
   EntryAdder inner = outer.addDictionary("P", 3);
   inner.add("A", u32(7));
-  inner.add("B", std::string(100, 'b'));
+  inner.add("B", Text(std::string(100, 'b')));
   inner.addDictionary("C", 0);
   ReportValue taken(u8(0));
   taken = ReportValue(std::move(outer));
   EXPECT_EQ(outer.size(), 0u);
   EXPECT_THAT(keys(taken.at("P").as<Dictionary>()), ElementsAre("A", "B", "C"));
   EXPECT_EQ(taken.at("P").at("A").as<std::uint32_t>(), 7u);
-  EXPECT_EQ(taken.at("P").at("B").as<std::string>(), std::string(100, 'b'));
+  EXPECT_EQ(taken.at("P").at("B").as<vesk::Text>(), std::string(100, 'b'));
   EXPECT_EQ(taken.at("P").at("C").size(), 0u);
 }
 
@@ -218,7 +220,7 @@ TEST(Dictionary, MovesOfTheWholeTree) {
   EXPECT_TRUE(c == nested());
   Dictionary d(1), e(1);
   d.add("A", u8(1));
-  e.add("B", std::string(50, 'x'));
+  e.add("B", Text(std::string(50, 'x')));
   e = std::move(d);
   EXPECT_THAT(keys(e), ElementsAre("A"));
   EXPECT_EQ(d.size(), 0u);  // NOLINT: what is left can still be asked

@@ -46,7 +46,7 @@ TEST_F(OptionByte, EveryByteAsADictionary) {
   for (unsigned value = 0; value <= 0xFF; ++value) {
     const ReportValue dictionary = plugin->blackBoxOptionToDict(static_cast<std::uint8_t>(value));
     EXPECT_THAT(keysOf(dictionary), testing::UnorderedElementsAre("ERROR_LEVEL", "OPTIONS_RAW"));
-    EXPECT_EQ(dictionary.at("ERROR_LEVEL").as<std::string>(), levelName(value & 7));
+    EXPECT_EQ(dictionary.at("ERROR_LEVEL").as<vesk::Text>(), levelName(value & 7));
     EXPECT_EQ(dictionary.at("OPTIONS_RAW").as<std::int32_t>(), static_cast<std::int32_t>(value));
   }
 }
@@ -74,9 +74,9 @@ TEST_F(OptionByte, Examples) {
   };
   for (const auto &row : rows)
     EXPECT_EQ(plugin->blackBoxOptionToString(row.option, row.name, row.printLevel), row.line);
-  EXPECT_EQ(plugin->blackBoxOptionToDict(0x0A).at("ERROR_LEVEL").as<std::string>(), "INFO");
+  EXPECT_EQ(plugin->blackBoxOptionToDict(0x0A).at("ERROR_LEVEL").as<vesk::Text>(), "INFO");
   EXPECT_EQ(plugin->blackBoxOptionToDict(0x0A).at("OPTIONS_RAW").as<std::int32_t>(), 10);
-  EXPECT_EQ(plugin->blackBoxOptionToDict(0xFF).at("ERROR_LEVEL").as<std::string>(), "UNKNOWN");
+  EXPECT_EQ(plugin->blackBoxOptionToDict(0xFF).at("ERROR_LEVEL").as<vesk::Text>(), "UNKNOWN");
   EXPECT_EQ(plugin->blackBoxOptionToDict(0xFF).at("OPTIONS_RAW").as<std::int32_t>(), 255);
 }
 

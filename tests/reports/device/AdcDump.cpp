@@ -158,7 +158,7 @@ TEST(AdcDumpConfig, MaskShowsItsHighWordFirst) {
 TEST(AdcDumpConfig, AnyTriggerButZeroIsTheTimer) {
   for (const std::uint32_t trigger : {1u, 2u, 0x100u, 0x10000u, 0x80000000u, 0xFFFFFFFFu}) {
     EXPECT_EQ(decodeLines(config().u32(21, trigger))[6], "Trigger Source      = STIM_TIMER");
-    EXPECT_EQ(decodeValue(config().u32(21, trigger)).at("TRIGGER_SOURCE").as<std::string>(), "STIM_TIMER");
+    EXPECT_EQ(decodeValue(config().u32(21, trigger)).at("TRIGGER_SOURCE").as<vesk::Text>(), "STIM_TIMER");
   }
 }
 
@@ -180,7 +180,7 @@ TEST(AdcDumpState, EveryByte) {
     const std::string name = value == 0 ? "STANDBY" : value == 1 ? "SINGLE" : value == 2 ? "CONTINUOUS" : "INVALID";
     const Report report = state(static_cast<std::uint8_t>(value));
     EXPECT_THAT(decodeLines(report), ElementsAre("ADC Dump State: " + name));
-    EXPECT_EQ(decodeValue(report).as<std::string>(), name);  // a bare string, no dictionary
+    EXPECT_EQ(decodeValue(report).as<vesk::Text>(), name);  // a bare string, no dictionary
   }
 }
 

@@ -16,25 +16,25 @@ std::string decoded(unsigned id, bool strings, std::string_view text) {
 
 TEST(Version, TextAsItStands) {
   EXPECT_THAT(decodeLines(version(0xD0, "1.2.3")), ElementsAre("1.2.3"));
-  EXPECT_EQ(decodeValue(version(0xD0, "1.2.3")).as<std::string>(), "1.2.3");  // a bare string, no dictionary
+  EXPECT_EQ(decodeValue(version(0xD0, "1.2.3")).as<vesk::Text>(), "1.2.3");  // a bare string, no dictionary
 }
 
 TEST(Version, EmptyText) {
   EXPECT_THAT(decodeLines(version(0xD0, "")), ElementsAre(""));
-  EXPECT_EQ(decodeValue(version(0xD0, "")).as<std::string>(), "");
+  EXPECT_EQ(decodeValue(version(0xD0, "")).as<vesk::Text>(), "");
   EXPECT_THAT(decodeLines(version(0xD2, "")), ElementsAre(""));
   EXPECT_EQ(decoded(0xD2, false, ""), "raises out_of_range");
 }
 
 TEST(Version, LineFeedsStayInsideTheOneLine) {
   EXPECT_THAT(decodeLines(version(0xD0, "a\nb\n")), ElementsAre("a\nb\n"));
-  EXPECT_EQ(decodeValue(version(0xD0, "a\nb\n")).as<std::string>(), "a\nb\n");
+  EXPECT_EQ(decodeValue(version(0xD0, "a\nb\n")).as<vesk::Text>(), "a\nb\n");
 }
 
 TEST(Version, TextEndsAtTheFirstZero) {
   const Report report = Report(0xD0, 40).text(1, "one").text(6, "two");
   EXPECT_THAT(decodeLines(report), ElementsAre("one"));
-  EXPECT_EQ(decodeValue(report).as<std::string>(), "one");
+  EXPECT_EQ(decodeValue(report).as<vesk::Text>(), "one");
 }
 
 TEST(Version, LengthIsNotConsulted) {
@@ -46,7 +46,7 @@ TEST(Version, LengthIsNotConsulted) {
       if (strings)
         EXPECT_THAT(linesOf(result), ElementsAre("1.2.3"));
       else
-        EXPECT_EQ(std::get<ReportValue>(result).as<std::string>(), "1.2.3");
+        EXPECT_EQ(std::get<ReportValue>(result).as<vesk::Text>(), "1.2.3");
     }
   }
 }
@@ -56,7 +56,7 @@ TEST(Version, TextUpToTheEndOfWhatIsReadable) {
     const std::string text(size, 'v');
     Decoder lines(true), value(false);  // no zero in the report itself: the padding ends the text
     EXPECT_THAT(linesOf(lines(0xD0, "\xD0" + text)), ElementsAre(text));
-    EXPECT_EQ(std::get<ReportValue>(value(0xD0, "\xD0" + text)).as<std::string>(), text);
+    EXPECT_EQ(std::get<ReportValue>(value(0xD0, "\xD0" + text)).as<vesk::Text>(), text);
   }
 }
 
@@ -67,7 +67,7 @@ TEST(Version, EveryOffset) {
       const std::string text = std::string(299, '.').replace(at - 1, 1, "X");
       ASSERT_THAT(decodeLines(version(id, text)), ElementsAre(text)) << at;
       if (id == 0xD0) {
-        ASSERT_EQ(decodeValue(version(id, text)).as<std::string>(), text) << at;
+        ASSERT_EQ(decodeValue(version(id, text)).as<vesk::Text>(), text) << at;
       }
       ASSERT_THAT(decodeLines(Report(id, 301).text(1, std::string(at - 1, '.')).text(at + 1, "X")),
                   ElementsAre(std::string(at - 1, '.')));
@@ -89,7 +89,7 @@ TEST(ExtendedVersion, SevenLines) {
   const Report report = version(0xD2, "1\n2\n3\n4\n5\n6\n7");
   EXPECT_THAT(decodeLines(report), ElementsAre("1", "2", "3", "4", "5", "6", "7"));
   EXPECT_EQ(decodeValue(report).size(), 6u);
-  EXPECT_EQ(decodeValue(report).at("ALGS").as<std::string>(), "6");
+  EXPECT_EQ(decodeValue(report).at("ALGS").as<vesk::Text>(), "6");
 }
 
 TEST(ExtendedVersion, SplittingKeepsEmptyPieces) {
