@@ -7,7 +7,7 @@ namespace vesk::host {
 
 namespace {
 
-constexpr std::size_t kWriteAt = std::size_t{64} << 10;  // how much output is gathered for one write
+constexpr std::size_t kWriteAt = std::size_t{256} << 10;  // how much output is gathered for one write
 
 }  // namespace
 
