@@ -30,7 +30,8 @@ Written written(T value) {
 }
 
 TEST(JsonValue, bareValuesStandBare) {
-  EXPECT_EQ(written(std::string("SINGLE")), (Written{R"("SINGLE")", ""}));
+  EXPECT_EQ(written(Text(vesk::Key("SINGLE"))), (Written{R"("SINGLE")", ""}));
+  EXPECT_EQ(written(Text(std::string_view("SIN\"GLE"))), (Written{R"("SIN\"GLE")", ""}));
   EXPECT_EQ(written(std::uint8_t{7}), (Written{"7", ""}));
   EXPECT_EQ(written(true), (Written{"true", ""}));
   EXPECT_EQ(written(false), (Written{"false", ""}));
