@@ -1,7 +1,7 @@
 // The queue between the reading thread and the decoding ones, and the delivery in order.
 #include "host/decode/Workers.h"
 
-#include <system_error>
+#include <exception>
 
 namespace vesk::host {
 
@@ -13,13 +13,18 @@ constexpr unsigned kBatchesEach = 3;
 }  // namespace
 
 Workers::Workers(unsigned count, const MakePrinter &makePrinter, Deliver deliver) : deliver_(std::move(deliver)) {
-  for (unsigned i = 0; i < count * kBatchesEach + 1; ++i) spare_.push_back(std::make_unique<Batch>());
-  for (unsigned i = 0; i < count; ++i) hands_.push_back({makePrinter(), {}});
+  const std::size_t batches = std::size_t{count} * kBatchesEach + 1;
+  spare_.reserve(batches);  // giving one back must not fail
+  for (std::size_t i = 0; i < batches; ++i) spare_.push_back(std::make_unique<Batch>());
+  for (unsigned i = 0; i < count; ++i) {
+    hands_.push_back({makePrinter(), {}});
+    hands_.back().outputs.reserve(batches);
+  }
   threads_.reserve(count - 1);
   for (unsigned i = 1; i < count; ++i) {
     try {
       threads_.emplace_back([this, i] { work(hands_[i]); });
-    } catch (const std::system_error &) {
+    } catch (const std::exception &) {  // no thread, or no memory for one
       break;  // the machine has no more to give; those that run do all the work
     }
   }
@@ -96,8 +101,12 @@ void Workers::runNext(std::unique_lock<std::mutex> &lock, Hand &hand) {
     failure = std::current_exception();
   }
   lock.lock();
+  try {
+    if (!failure) done_.emplace(number, Done{std::move(batch), std::move(output), &hand});
+  } catch (...) {
+    failure = std::current_exception();
+  }
   if (failure) failure_ = failure;
-  done_.emplace(number, Done{std::move(batch), std::move(output), &hand});
   deliverInOrder(lock);
   changed_.notify_all();
 }
