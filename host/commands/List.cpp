@@ -1,5 +1,6 @@
 // `list`: the HID devices of this machine, and which of them is the controller.
 #include <algorithm>
+#include <cstring>
 
 #include "host/commands/Command.h"
 #include "host/device/Hidraw.h"
@@ -89,7 +90,7 @@ std::string jsonList(const std::vector<DeviceIdentity> &devices) {
 
 }  // namespace
 
-void addList(CLI::App &app, CommandContext &) {
+void addList(CLI::App &app, CommandContext &context) {
   CLI::App *command =
       app.add_subcommand("list", "List HID devices; the controller is known by the reports it declares");
   const auto form = std::make_shared<std::string>("text");
@@ -97,9 +98,23 @@ void addList(CLI::App &app, CommandContext &) {
       ->check(CLI::IsMember({"text", "json"}))
       ->type_name("FORM")
       ->capture_default_str();
-  command->callback([form] {
-    const auto devices = Hidraw().list();
+  command->callback([form, &context] {
+    Messages messages(context.messages);
+    std::vector<DeviceIdentity> devices;
+    try {
+      devices = Hidraw().list();
+    } catch (const DeviceError &error) {
+      messages.add(error.message());
+    }
+    for (const DeviceIdentity &device : devices)
+      if (device.unreadable != 0)
+        messages.add({&kDeviceUnopened,
+                      device.node,
+                      {},
+                      {},
+                      std::string("cannot be looked at: ") + std::strerror(device.unreadable)});
     OutputFile("-").write(*form == "json" ? jsonList(devices) : textList(devices));
+    context.exitCode = messages.exitCode();
   });
 }
 

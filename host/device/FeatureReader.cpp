@@ -62,15 +62,18 @@ std::string secondsText(milliseconds time) {
 
 FeatureReader::Answer FeatureReader::get(std::uint32_t id) {
   using Clock = std::chrono::steady_clock;
-  std::memset(buffer_.data(), 0, buffer_.size());
-  buffer_[0] = static_cast<char>(id);
   const auto begin = Clock::now();
+  milliseconds elapsed{0};
   int count = 0;
-  {
-    const AlarmClock alarm(timeout_);
+  do {
+    std::memset(buffer_.data(), 0, buffer_.size());
+    buffer_[0] = static_cast<char>(id);
+    const AlarmClock alarm(timeout_ - elapsed);
     count = node_.getFeature(buffer_);
-  }
-  if (count < 0) return judgeFailure(-count, std::chrono::duration_cast<milliseconds>(Clock::now() - begin));
+    elapsed = std::chrono::duration_cast<milliseconds>(Clock::now() - begin);
+    // Whoever is stopped and continued may be interrupted by that: the request begins anew.
+  } while (count == -EINTR && !stop_.requested() && elapsed < timeLimit() - kTimerSlack);
+  if (count < 0) return judgeFailure(-count, elapsed);
 
   // The kernel hands on whatever comes: it compares neither the ID nor the size with what was declared.
   if (count == 0) return problem(kEmptyAnswer, "the device's answer is empty");
@@ -85,9 +88,8 @@ FeatureReader::Answer FeatureReader::judgeFailure(int error, milliseconds elapse
   // A signal makes the request fail as a broken device would, so the flag is asked before the errno.
   if (stop_.requested()) return {{}, {}, false, true};
   if (error == ENODEV || node_.isGone(kLeaving)) return {{}, {}, true, false};
-  const milliseconds limit = std::min(timeout_, kKernelTimeout);
-  if (error == ETIMEDOUT || elapsed >= limit - kTimerSlack)
-    return problem(kRequestTimeout, "no answer within " + secondsText(limit));
+  if (error == ETIMEDOUT || elapsed >= timeLimit() - kTimerSlack)
+    return problem(kRequestTimeout, "no answer within " + secondsText(timeLimit()));
   return problem(kRequestFailed, std::string("the device refused the request: ") + std::strerror(error));
 }
 

@@ -1,6 +1,7 @@
 // Reads feature reports from a device and judges what it answers.
 #pragma once
 
+#include <algorithm>
 #include <optional>
 #include <string>
 
@@ -35,6 +36,7 @@ class FeatureReader {
 
  private:
   Answer judgeFailure(int error, milliseconds elapsed);
+  milliseconds timeLimit() const { return std::min(timeout_, kKernelTimeout); }
 
   HidNode &node_;
   milliseconds timeout_;

@@ -21,6 +21,7 @@ struct DeviceIdentity {
   std::uint16_t product = 0;
   std::string name, serial, physicalPath;  // empty where the device does not say
   std::string descriptor;                  // its report descriptor
+  int unreadable = 0;                      // an errno: why the machine does not tell all of this
 };
 
 /// An open device. Its functions may be called from several threads at once.
@@ -38,8 +39,9 @@ class HidNode {
   /// Takes the oldest input report of the queue. Returns its bytes, or minus an errno: EAGAIN where none waits, EIO or
   /// ENODEV where the device has gone and all that it had sent was taken.
   virtual int read(std::span<char> report) = 0;
-  /// Waits until there is something to read, the device has gone or `wakeFd` can be read.
-  virtual void waitForReport(int wakeFd) = 0;
+  /// Waits until there is something to read, the device has gone or `wakeFd` can be read; a signal may end it too.
+  /// Returns 0, or minus an errno where it cannot wait.
+  virtual int waitForReport(int wakeFd) = 0;
   /// Whether the device has gone, or goes within this time: a request that it leaves unanswered fails a little before
   /// the node knows.
   virtual bool isGone(milliseconds within) = 0;
@@ -54,7 +56,7 @@ class HidSystem {
 
   virtual ~HidSystem() = default;
 
-  /// All HID devices; needs no rights.
+  /// All HID devices; needs no rights. Throws DeviceError where the machine does not tell.
   virtual std::vector<DeviceIdentity> list() = 0;
   /// Opens for reading only, so that nothing can ever be written to a device.
   virtual Opened open(const std::string &path) = 0;

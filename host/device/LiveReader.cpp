@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <exception>
 #include <thread>
 
 #include "host/device/FeatureReader.h"
@@ -15,7 +16,7 @@ namespace vesk::host {
 
 namespace {
 
-constexpr milliseconds kLookAgainAfter{200};
+constexpr milliseconds kLookAgainAfter{200}, kHotPlugTime{1000};
 
 /// A device is the same if all is equal that it takes along to another node or port.
 bool isSame(const DeviceIdentity &a, const DeviceIdentity &b) {
@@ -45,38 +46,59 @@ bool LiveReader::isOver() const {
 
 void LiveReader::run() {
   for (;;) {
-    readUntilGone();
+    const auto opened = Clock::now();
+    const int error = readUntilGone();
     if (isOver()) break;
+    const std::string text =
+        error == 0 ? "the device has gone" : std::string("the device cannot be read: ") + std::strerror(error);
     if (!options_.reconnect) {
-      queue_.push(Message{&kDeviceGone, identity_.node, {}, {}, "the device has gone"});
+      queue_.push(Message{error == 0 ? &kDeviceGone : &kDeviceUnreadable, identity_.node, {}, {}, text});
       break;
     }
-    queue_.push(Message{&kDeviceAway, identity_.node, {}, {}, "the device has gone; waiting for its return"});
+    queue_.push(Message{&kDeviceAway, identity_.node, {}, {}, text + "; waiting for its return"});
     node_.reset();  // the next one can have the same path only if nobody holds this one
+    // One that can be opened and not be read is not to be opened without a pause.
+    if (Clock::now() - opened < kLookAgainAfter) stop_.waitFor(kLookAgainAfter);
     if (!waitForReturn()) break;
   }
   queue_.close();
 }
 
-void LiveReader::readUntilGone() {
+int LiveReader::readUntilGone() {
   Stop gone;
+  int error = 0;
+  std::exception_ptr failure, failureHere;
   std::thread inputs;
   {
     const SignalsElsewhere here;
-    inputs = std::thread([&] { readInputs(gone); });
+    inputs = std::thread([&] {
+      try {
+        error = readInputs(gone);
+      } catch (...) {
+        failure = std::current_exception();
+      }
+      gone.request();
+    });
   }
-  pollFeatures(gone);
+  try {
+    pollFeatures(gone);
+  } catch (...) {
+    failureHere = std::current_exception();
+  }
   gone.request();
   inputs.join();
+  for (const std::exception_ptr &thrown : {failure, failureHere})
+    if (thrown) std::rethrow_exception(thrown);
+  // What an unplug looks like.
+  return error == EIO || error == ENODEV ? 0 : error;
 }
 
-void LiveReader::readInputs(Stop &gone) {
+int LiveReader::readInputs(Stop &gone) {
   std::string buffer(HidNode::kFullBuffer, '\0');
   while (!gone.requested()) {
-    const int count = node_->read(buffer);
-    if (count == -EAGAIN) {
-      node_->waitForReport(gone.fd());
-    } else if (count > 0) {
+    int count = node_->read(buffer);
+    if (count == -EAGAIN) count = node_->waitForReport(gone.fd());
+    if (count > 0) {
       if (!options_.inputs) continue;
       LiveReport report;
       report.bytes.assign(buffer.data(), static_cast<std::size_t>(count));
@@ -84,10 +106,10 @@ void LiveReader::readInputs(Stop &gone) {
       report.timeNs = elapsedNs();
       queue_.push(std::move(report));
     } else if (count != -EINTR && count != 0) {
-      break;
+      return -count;
     }
   }
-  gone.request();
+  return 0;
 }
 
 bool LiveReader::sleepUntil(Clock::time_point time, const Stop &gone) const {
@@ -116,18 +138,35 @@ void LiveReader::pollFeatures(const Stop &gone) {
   }
 }
 
-bool LiveReader::waitForReturn() {
-  while (!isOver()) {
+bool LiveReader::openAgain(std::string &problem) {
+  try {
     for (const DeviceIdentity &device : system_.list()) {
       if (!isSame(device, identity_)) continue;
-      // Rights come a little later than the node; this looks again until they are there.
-      if (HidSystem::Opened opened = system_.open(device.node); opened.node) {
+      HidSystem::Opened opened = system_.open(device.node);
+      if (opened.node) {
         queue_.push(Message{&kDeviceBack, identity_.node, {}, {}, "the device is back, as " + device.node});
         node_ = std::move(opened.node);
         return true;
       }
+      problem = "the device is back, as " + device.node + ", but cannot be opened: " + std::strerror(opened.error);
     }
-    stop_.waitFor(kLookAgainAfter);
+  } catch (const DeviceError &error) {
+    problem = error.message().file + " " + error.message().text;
+  }
+  return false;
+}
+
+bool LiveReader::waitForReturn() {
+  std::optional<Clock::time_point> seen;
+  for (bool isTold = false; !isOver(); stop_.waitFor(kLookAgainAfter)) {
+    std::string problem;
+    if (openAgain(problem)) return true;
+    if (problem.empty() || isTold) continue;
+    // Rights come a little later than the node; only where they stay away there is something to tell.
+    if (!seen) seen = Clock::now();
+    if (Clock::now() - *seen < kHotPlugTime) continue;
+    queue_.push(Message{&kDeviceShut, identity_.node, {}, {}, problem + "; trying on"});
+    isTold = true;
   }
   return false;
 }

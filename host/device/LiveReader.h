@@ -13,6 +13,7 @@
 namespace vesk::host {
 
 inline constexpr MessageKind kDeviceAway{"device-away", Severity::kWarning, kExitOk};
+inline constexpr MessageKind kDeviceShut{"device-shut", Severity::kWarning, kExitOk};
 inline constexpr MessageKind kDeviceBack{"device-back", Severity::kWarning, kExitOk};
 
 /// Input reports have a thread of their own, because a feature request can wait for seconds, and the kernel keeps no
@@ -30,16 +31,20 @@ class LiveReader {
   LiveReader(HidSystem &system, std::unique_ptr<HidNode> node, const Options &options, Stop &stop, LiveQueue &queue);
 
   /// Fills the queue until a stop is requested, the duration is over, or the device has gone and is not waited for.
-  /// To be called on the thread to which signals come; closes the queue at the end.
+  /// To be called on the thread to which signals come; closes the queue at the end. Throws where the machine gives no
+  /// thread or no memory.
   void run();
 
  private:
   using Clock = std::chrono::steady_clock;
 
-  void readUntilGone();
-  void readInputs(Stop &gone);
+  /// Returns 0 where the device has gone or nothing more is wanted, or the errno of a device that cannot be read.
+  int readUntilGone();
+  /// Returns 0, or the errno that ended it.
+  int readInputs(Stop &gone);
   void pollFeatures(const Stop &gone);
   bool waitForReturn();
+  bool openAgain(std::string &problem);
   std::int64_t elapsedNs() const;
   bool isOver() const;
   /// Until the time has come, or the end; false at the end.

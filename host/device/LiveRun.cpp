@@ -3,7 +3,10 @@
 
 #include <algorithm>
 #include <exception>
+#include <system_error>
 #include <thread>
+
+#include "host/device/OpenDevice.h"
 
 namespace vesk::host {
 
@@ -15,6 +18,14 @@ constexpr milliseconds kIdleAfter{100};
 
 LiveCounts LiveRun::run(HidSystem &system, std::unique_ptr<HidNode> node) {
   node_ = node->identity().node;
+  try {
+    return runThreads(system, std::move(node));
+  } catch (const std::system_error &error) {  // no thread, or no descriptor to wake one
+    throw DeviceError({&kDeviceUnreadable, node_, {}, {}, std::string("the device cannot be read: ") + error.what()});
+  }
+}
+
+LiveCounts LiveRun::runThreads(HidSystem &system, std::unique_ptr<HidNode> node) {
   LiveQueue queue(options_.queueCapacity);
   LiveReader reader(system, std::move(node), options_.reader, stop_, queue);
   std::exception_ptr failure;
@@ -30,7 +41,13 @@ LiveCounts LiveRun::run(HidSystem &system, std::unique_ptr<HidNode> node) {
       stop_.request();
     });
   }
-  reader.run();
+  try {
+    reader.run();
+  } catch (...) {
+    queue.close();
+    consumer.join();
+    throw;
+  }
   consumer.join();
   if (failure) std::rethrow_exception(failure);
 

@@ -43,10 +43,12 @@ class LiveRun {
   LiveRun(const Options &options, Stop &stop, LiveConsumer &consumer)
       : options_(options), stop_(stop), consumer_(consumer) {}
 
-  /// Until the count is reached, a stop is requested, or the reader ends. Passes on what the consumer throws.
+  /// Until the count is reached, a stop is requested, or the reader ends. Passes on what the consumer throws;
+  /// throws DeviceError where the machine has no threads to read with.
   LiveCounts run(HidSystem &system, std::unique_ptr<HidNode> node);
 
  private:
+  LiveCounts runThreads(HidSystem &system, std::unique_ptr<HidNode> node);
   void consume(LiveQueue &queue);
   void take(LiveEvent &event);
   void report(const LiveReport &report);

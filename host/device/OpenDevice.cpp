@@ -29,6 +29,10 @@ std::optional<std::uint16_t> parseId(std::string_view digits) {
   return id;
 }
 
+bool isPath(const std::string &name) {
+  return name.find('/') != std::string::npos;
+}
+
 bool hasIds(const DeviceIdentity &device, std::string_view name) {
   const std::size_t colon = name.find(':');
   if (colon == std::string_view::npos) return false;
@@ -48,6 +52,8 @@ std::string listed(std::span<const DeviceIdentity> devices) {
     if (!device.name.empty()) text += "  " + printable(device.name);
     if (!device.serial.empty()) text += "  serial " + printable(device.serial);
     if (speaksOurReports(device.descriptor)) text += "  (speaks the controller's reports)";
+    if (device.unreadable != 0)
+      text += std::string("  (cannot be looked at: ") + std::strerror(device.unreadable) + ")";
   }
   return text;
 }
@@ -68,8 +74,11 @@ std::string rightsOf(const std::string &node) {
 DeviceError denied(HidSystem &system, const std::string &node, int error) {
   std::string text = std::string("cannot be opened: ") + std::strerror(error) + rightsOf(node);
   const std::string target = canonicalNode(node);
-  for (const DeviceIdentity &device : system.list())
-    if (device.node == target) text += "; this udev rule would help:\n" + udevRule(device);
+  try {
+    for (const DeviceIdentity &device : system.list())
+      if (device.node == target) text += "; this udev rule would help:\n" + udevRule(device);
+  } catch (const DeviceError &) {  // the rights are what is wrong; the rule was only a help
+  }
   while (text.ends_with('\n')) text.pop_back();
   return DeviceError({&kDeviceDenied, node, {}, {}, text});
 }
@@ -77,7 +86,7 @@ DeviceError denied(HidSystem &system, const std::string &node, int error) {
 }  // namespace
 
 std::string findDevice(std::span<const DeviceIdentity> devices, const std::string &name) {
-  if (name.find('/') != std::string::npos) return name;
+  if (isPath(name)) return name;
   std::vector<DeviceIdentity> called;
   std::ranges::copy_if(devices, std::back_inserter(called), [&](const auto &device) { return isCalled(device, name); });
   const auto speaks = [](const DeviceIdentity &device) { return speaksOurReports(device.descriptor); };
@@ -102,13 +111,14 @@ std::string canonicalNode(const std::string &path) {
 }
 
 std::unique_ptr<HidNode> openDevice(HidSystem &system, const std::string &name, const Stop &stop) {
-  const std::string node = findDevice(system.list(), name);
+  const std::string node = isPath(name) ? name : findDevice(system.list(), name);
   const auto end = std::chrono::steady_clock::now() + kHotPlugTime;
   for (;;) {
     HidSystem::Opened opened = system.open(node);
     if (opened.node) return std::move(opened.node);
     const bool isDenied = opened.error == EACCES || opened.error == EPERM;
-    if ((isDenied || opened.error == ENOENT) && std::chrono::steady_clock::now() < end) {
+    const bool mayChange = isDenied || opened.error == ENOENT || opened.error == EINTR;
+    if (mayChange && std::chrono::steady_clock::now() < end) {
       if (stop.waitFor(kRetryAfter)) return nullptr;
       continue;
     }

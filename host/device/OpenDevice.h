@@ -16,6 +16,7 @@ inline constexpr MessageKind kNoDevice{"no-device", Severity::kError, kExitUnrea
 inline constexpr MessageKind kAmbiguousDevice{"ambiguous-device", Severity::kError, kExitUsage};
 inline constexpr MessageKind kDeviceDenied{"device-denied", Severity::kError, kExitUnreadable};
 inline constexpr MessageKind kDeviceUnopened{"device-unopened", Severity::kError, kExitUnreadable};
+inline constexpr MessageKind kDeviceUnreadable{"device-unreadable", Severity::kError, kExitUnreadable};
 inline constexpr MessageKind kDeviceGone{"device-gone", Severity::kError, kExitUnreadable};
 inline constexpr MessageKind kInterrupted{"interrupted", Severity::kWarning, kExitOk};
 
@@ -38,7 +39,8 @@ std::string findDevice(std::span<const DeviceIdentity> devices, const std::strin
 std::string canonicalNode(const std::string &path);
 
 /// Opens the device that `name` means. For a second it tries again where rights are missing or the node is: after
-/// hot-plug both come a little later than the device. Throws DeviceError; returns null when a stop was requested.
+/// hot-plug both come a little later than the device; and where a signal came between. Throws DeviceError; returns null
+/// when a stop was requested.
 std::unique_ptr<HidNode> openDevice(HidSystem &system, const std::string &name, const Stop &stop);
 
 /// "1234:5678"

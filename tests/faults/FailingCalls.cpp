@@ -3,9 +3,13 @@
 // VESK_FAULT says which: "write 3 ENOSPC" (by number: "write 3 28"), "read 2 short", "write all short", or "count
 // FILE", which lets all succeed and writes "read 17" and so on into FILE at the end. Only the program's own calls are
 // seen, not those that the C library makes for itself.
+#include <dirent.h>
 #include <dlfcn.h>
 #include <fcntl.h>
+#include <poll.h>
 #include <pthread.h>
+#include <sys/eventfd.h>
+#include <sys/ioctl.h>
 #include <sys/stat.h>
 #include <sys/types.h>
 #include <unistd.h>
@@ -19,9 +23,24 @@
 
 namespace {
 
-enum Call { kOpen, kRead, kWrite, kClose, kRename, kFsync, kMkostemp, kStat, kIoctl, kThread, kCalls };
-constexpr const char *kNames[kCalls] = {"open",  "read",     "write", "close", "rename",
-                                        "fsync", "mkostemp", "stat",  "ioctl", "thread"};
+enum Call {
+  kOpen,
+  kRead,
+  kWrite,
+  kClose,
+  kRename,
+  kFsync,
+  kMkostemp,
+  kIoctl,
+  kPoll,
+  kEventfd,
+  kTmpfile,
+  kOpendir,
+  kThread,
+  kCalls
+};
+constexpr const char *kNames[kCalls] = {"open",  "read", "write",   "close",   "rename",  "fsync", "mkostemp",
+                                        "ioctl", "poll", "eventfd", "tmpfile", "opendir", "thread"};
 
 struct Fault {
   int call = -1;
@@ -146,13 +165,44 @@ int mkostemp64(char *name, int flags) {
   return next<int(char *, int)>("mkostemp64")(name, flags);
 }
 
-int ioctl(int fd, unsigned long request, ...) {
+int ioctl(int fd, unsigned long request, ...) noexcept {
   va_list arguments;
   va_start(arguments, request);
   void *argument = va_arg(arguments, void *);
   va_end(arguments);
-  if (fate(kIoctl) == Fate::kFails) return -1;
-  return next<int(int, unsigned long, ...)>("ioctl")(fd, request, argument);
+  const Fate what = fate(kIoctl);
+  if (what == Fate::kFails) return -1;
+  const int result = next<int(int, unsigned long, ...)>("ioctl")(fd, request, argument);
+  return what == Fate::kShort && result > 1 ? result / 2 : result;
+}
+
+int poll(pollfd *fds, nfds_t count, int time) {
+  if (fate(kPoll) == Fate::kFails) return -1;
+  return next<int(pollfd *, nfds_t, int)>("poll")(fds, count, time);
+}
+
+int eventfd(unsigned start, int flags) noexcept {
+  if (fate(kEventfd) == Fate::kFails) return -1;
+  return next<int(unsigned, int)>("eventfd")(start, flags);
+}
+
+FILE *tmpfile() {
+  if (fate(kTmpfile) == Fate::kFails) return nullptr;
+  return next<FILE *()>("tmpfile")();
+}
+
+DIR *opendir(const char *path) {
+  if (fate(kOpendir) == Fate::kFails) return nullptr;
+  return next<DIR *(const char *)>("opendir")(path);
+}
+
+int openat(int folder, const char *path, int flags, ...) {
+  va_list arguments;
+  va_start(arguments, flags);
+  const mode_t mode = modeOf(flags, arguments);
+  va_end(arguments);
+  if ((flags & O_DIRECTORY) != 0 && fate(kOpendir) == Fate::kFails) return -1;
+  return next<int(int, const char *, int, ...)>("openat")(folder, path, flags, mode);
 }
 
 }  // extern "C"

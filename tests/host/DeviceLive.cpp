@@ -1,9 +1,11 @@
 // Live runs: what comes is passed on in order, what is lost is told, and every end is a clean one.
 #include <atomic>
+#include <system_error>
 #include <thread>
 
 #include "host/device/ChangeFilter.h"
 #include "host/device/LiveRun.h"
+#include "host/device/OpenDevice.h"
 #include "tests/host/FakeHid.h"
 
 namespace {
@@ -215,6 +217,46 @@ TEST_F(Runs, goOnAfterASignalThatIsNotForThem) {
   run();
   EXPECT_THAT(keeper_.reports, ElementsAre(image(1), image(2)));
   EXPECT_THAT(keeper_.messages, IsEmpty());
+}
+
+TEST_F(Runs, tellWhyADeviceThatIsThereCannotBeRead) {
+  node_->inputs = {image(1), ENOMEM};
+  run();
+  EXPECT_THAT(keeper_.reports, ElementsAre(image(1)));
+  EXPECT_THAT(keeper_.messages, ElementsAre("device-unreadable"));
+  EXPECT_EQ(keeper_.texts[0], "the device cannot be read: Cannot allocate memory");
+}
+
+TEST_F(Runs, endWhereTheyCannotWaitForReports) {
+  node_->inputs = {image(1)};
+  node_->cannotWait = ENOMEM;
+  EXPECT_EQ(run().inputs, 1u);
+  EXPECT_THAT(keeper_.messages, ElementsAre("device-unreadable"));
+}
+
+TEST_F(Runs, passOnWhatTheReadingThreadsThrow) {
+  class Throwing : public FakeNode {
+   public:
+    int read(std::span<char>) override { throw std::bad_alloc(); }
+  };
+  EXPECT_THROW(LiveRun(options_, stop_, keeper_).run(system_, std::make_unique<Throwing>()), std::bad_alloc);
+  node_->onGetFeature = [](std::uint8_t) -> Read { throw std::bad_alloc(); };
+  options_.reader.features = {{0xE0, 10s}};
+  EXPECT_THROW(run(), std::bad_alloc);
+}
+
+TEST_F(Runs, tellWhichDeviceAMachineWithoutThreadsCannotRead) {
+  class Throwing : public FakeNode {
+   public:
+    int read(std::span<char>) override { throw std::system_error(EAGAIN, std::generic_category()); }
+  };
+  try {
+    LiveRun(options_, stop_, keeper_).run(system_, std::make_unique<Throwing>());
+    FAIL();
+  } catch (const DeviceError &error) {
+    EXPECT_EQ(error.message().file, "/dev/hidraw1");
+    EXPECT_EQ(error.message().text, "the device cannot be read: Resource temporarily unavailable");
+  }
 }
 
 TEST_F(Runs, tellWhatIsLost) {

@@ -118,6 +118,26 @@ TEST_F(Requests, anInterruptIsNoDeviceError) {
   }
 }
 
+TEST_F(Requests, anInterruptThatIsNoStopIsPassedOver) {
+  int asked = 0;
+  node_.onGetFeature = [&](std::uint8_t) -> Read {
+    if (++asked < 3) return EINTR;
+    return std::string("\xE0\x0D", 2);
+  };
+  EXPECT_EQ(get(0xE0).bytes, "\xE0\x0D");
+  EXPECT_EQ(asked, 3);
+}
+
+TEST_F(Requests, interruptsWithoutEndAreATimeOut) {
+  node_.onGetFeature = [](std::uint8_t) {
+    std::this_thread::sleep_for(5ms);
+    return EINTR;
+  };
+  const auto begin = std::chrono::steady_clock::now();
+  expectProblem(get(0xE0, 200ms), "request-timeout", "no answer within 0.2 s");
+  EXPECT_LT(std::chrono::steady_clock::now() - begin, 5s);
+}
+
 TEST_F(Requests, aSignalEndsTheWait) {
   const StopOnSignals signals(stop_);
   node_.onGetFeature = [](std::uint8_t) { return waitInKernel(60s); };

@@ -55,6 +55,7 @@ class FakeNode : public HidNode {
   /// What reads give in turn; afterwards EAGAIN, or ENODEV once `leaves` is set.
   std::deque<Read> inputs;
   bool leaves = false;
+  int cannotWait = 0;  // an errno
   bool gone = false;
   std::size_t askedWith = 0;  // the size of the last request's buffer
 
@@ -72,9 +73,10 @@ class FakeNode : public HidNode {
     return give(next, report);
   }
 
-  void waitForReport(int wakeFd) override {
+  int waitForReport(int wakeFd) override {
     pollfd wake{wakeFd, POLLIN, 0};
-    ::poll(&wake, 1, -1);
+    if (cannotWait == 0) ::poll(&wake, 1, -1);
+    return -cannotWait;
   }
   bool isGone(milliseconds) override { return gone; }
 
