@@ -88,7 +88,9 @@ int runProgram(int argc, char **argv) {
 
 int main(int argc, char **argv) {
   occupyStandardDescriptors();
+  // Both would kill; without them the call fails and says why.
   std::signal(SIGPIPE, SIG_IGN);
+  std::signal(SIGXFSZ, SIG_IGN);
   try {
     return runProgram(argc, argv);
   } catch (const PipeClosed &) {

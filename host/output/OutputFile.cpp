@@ -55,16 +55,27 @@ OutputFile::~OutputFile() {
 }
 
 void OutputFile::write(std::string_view bytes) {
+  off_t done = 0;
   while (!bytes.empty()) {
     const ssize_t written = ::write(fd_, bytes.data(), bytes.size());
     if (written >= 0) {
       bytes.remove_prefix(static_cast<std::size_t>(written));
+      done += written;
     } else if (errno == EPIPE) {
       throw PipeClosed();
     } else if (errno != EINTR) {
+      const int error = errno;
+      if (isPublished()) takeBack(done);
+      errno = error;
       fail("cannot be written");
     }
   }
+}
+
+void OutputFile::takeBack(off_t size) {
+  const off_t start = ::lseek(fd_, -size, SEEK_CUR);
+  // Where that fails too there is nothing left to do.
+  if (start >= 0 && ::ftruncate(fd_, start) != 0) return;
 }
 
 void OutputFile::publish() {

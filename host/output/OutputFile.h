@@ -1,6 +1,8 @@
 // Where output goes: standard output, or a file that appears whole or not at all.
 #pragma once
 
+#include <sys/types.h>
+
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -24,7 +26,7 @@ class OutputFile {
   OutputFile(const OutputFile &) = delete;
   OutputFile &operator=(const OutputFile &) = delete;
 
-  /// Writes all of it. Throws OutputError or PipeClosed.
+  /// Writes all of it; of a file that has its name already, all or nothing. Throws OutputError or PipeClosed.
   void write(std::string_view bytes);
   /// Gives the file its name before it is done, for one that grows for a long time and is whole at any moment.
   /// Throws OutputError.
@@ -36,6 +38,9 @@ class OutputFile {
   bool isTerminal() const;
 
  private:
+  bool isPublished() const { return !path_.empty() && temporary_.empty(); }
+  /// Removes what was written last, so that the file ends where it was whole.
+  void takeBack(off_t size);
   [[noreturn]] void fail(const char *what) const;
 
   std::string name_;

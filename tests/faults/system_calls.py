@@ -147,6 +147,11 @@ def check_real_places(bench, form):
     result = subprocess.run(command, stdout=writing, stderr=subprocess.PIPE)
     os.close(writing)
     expect((result.returncode, result.stderr) == (0, b""), f"{form}: closed pipe: {result}")
+    bench.output.write_bytes(OLD)
+    result = subprocess.run(["bash", "-c", 'ulimit -f 1; exec "$@"', "-", *command, "-O", str(bench.output)],
+                            stderr=subprocess.PIPE)
+    expect(result.returncode == 5 and b"File too large" in result.stderr, f"{form}: a limit of file sizes: {result}")
+    expect(bench.output.read_bytes() == OLD and bench.left_over() == [], f"{form}: a limit of file sizes: files")
     result = subprocess.run([*command, "-O", str(bench.folder / "missing" / "out")], stderr=subprocess.PIPE)
     expect(result.returncode == 5 and b"No such file" in result.stderr, f"{form}: a folder that is not there: {result}")
 

@@ -2,9 +2,11 @@
 #include "host/output/OutputFile.h"
 
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <csignal>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -72,6 +74,23 @@ TEST_F(OutputFileTest, WritesToADeviceAsItIs) {
   file.write("gone");
   file.commit();
   EXPECT_TRUE(std::filesystem::is_character_file("/dev/null"));
+}
+
+TEST_F(OutputFileTest, EndsWhereItWasWholeIfItHasItsNameAlready) {
+  rlimit before{};
+  ::getrlimit(RLIMIT_FSIZE, &before);
+  const auto handler = std::signal(SIGXFSZ, SIG_IGN);
+  OutputFile file(path("out"));
+  file.publish();
+  const rlimit limit{1000, before.rlim_max};
+  ::setrlimit(RLIMIT_FSIZE, &limit);
+  file.write(std::string(600, 'a'));
+  EXPECT_THROW(file.write(std::string(600, 'b')), OutputError);
+  EXPECT_EQ(contents(path("out")), std::string(600, 'a'));
+  file.write(std::string(400, 'c'));
+  ::setrlimit(RLIMIT_FSIZE, &before);
+  std::signal(SIGXFSZ, handler);
+  EXPECT_EQ(contents(path("out")), std::string(600, 'a') + std::string(400, 'c'));
 }
 
 TEST_F(OutputFileTest, NamesTheFileAndTheReason) {
