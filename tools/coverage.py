@@ -21,8 +21,6 @@ COMPILE_TIME = re.compile(r"makeFourDigits|makeThreeHexDigits|parseConversion|op
 # Outcomes that cannot be, each with its reason in docs/TESTING.md.
 IMPOSSIBLE = {("plugin/Options.cpp", "if (!configuration || !configParser(*configuration, &error)) {"),
               ("values/DisplayLines.h", "friend bool operator==(const Iterator &, const Iterator &) = default;")}
-# Commands that need a device. They run in the emulated kernel (tests/kernel), where nobody counts.
-NEED_A_DEVICE = re.compile(r"host/commands/(Watch|List|Read|DeviceOutput|DeviceOptions|UdevRule)\.cpp|host/device/Hidraw\.cpp")
 
 
 def room_path(name):
@@ -79,11 +77,6 @@ def main():
     lines, branches = count_lines(pathlib.Path(sys.argv[1]), skipped), count_branches(export, skipped)
     show = "--show" in sys.argv[3:]
     failed = not lines
-    own = [key for key in lines if key[0].startswith("host/")]
-    print(f"host lines with what needs a device: {100.0 * sum(lines[key] != 0 for key in own) / max(1, len(own)):.2f} %")
-    for counts in (lines, branches):
-        for key in [key for key in counts if NEED_A_DEVICE.fullmatch(key[0])]:
-            del counts[key]
     for room in ("core", "host"):
         for what, counts in (("lines", lines), ("branches", branches)):
             own = [key for key in counts if ROOMS[key[0].split("/")[0]] == room]

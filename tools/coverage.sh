@@ -1,6 +1,5 @@
 #!/bin/bash
-# What the tests reach: lines and branches of the core (all of them must be) and lines of the host (95 % must be, but for
-# what needs a device).
+# What the tests reach: lines and branches of the core (all of them must be) and lines of the host (95 % must be).
 # Usage: tools/coverage.sh [--show]     (--show: what is not reached in the host too, line by line)
 # clang counts the outcomes of conditions as they stand in the source; the ways that only an exception takes are no
 # conditions, and are walked where each allocation fails in turn (tests/faults). Tests of how the program deals with the
