@@ -209,9 +209,10 @@ class Lists(Faults):
 
     def test_files_of_the_kernel_fail(self):
         calls = self.counts("list")
-        self.assertEqual(calls["open"], 4)
-        for call in ("open", "read"):
-            for number in range(1, calls[call] + 1):
+        files = {"open": 4, "read": 7}  # two of each device, read until nothing more comes; one is empty
+        for call, most in files.items():
+            self.assertGreaterEqual(calls[call], most)
+            for number in range(1, most + 1):
                 for code in (errno.EIO, errno.EACCES, errno.EMFILE):
                     result = self.failing(f"{call} {number} {code}", "list")
                     self.assertEqual(result.returncode, 3)
@@ -220,7 +221,7 @@ class Lists(Faults):
                 # It has left meanwhile.
                 result = self.ended(0, [], f"{call} {number} {errno.ENODEV}", "list")
                 self.assertEqual(len(result.stdout.splitlines()), 2)
-        for number in range(1, calls["read"] + 1):
+        for number in range(1, files["read"] + 1):
             for what in (errno.EINTR, "short"):
                 self.assertEqual(self.ended(0, [], f"read {number} {what}", "list").stdout, self.whole)
         self.assertEqual(self.ended(0, [], "read all short", "list").stdout, self.whole)

@@ -234,12 +234,15 @@ TEST_F(Runs, endWhereTheyCannotWaitForReports) {
   EXPECT_THAT(keeper_.messages, ElementsAre("device-unreadable"));
 }
 
-TEST_F(Runs, passOnWhatTheReadingThreadsThrow) {
+TEST_F(Runs, passOnWhatTheReaderOfInputsThrows) {
   class Throwing : public FakeNode {
    public:
     int read(std::span<char>) override { throw std::bad_alloc(); }
   };
   EXPECT_THROW(LiveRun(options_, stop_, keeper_).run(system_, std::make_unique<Throwing>()), std::bad_alloc);
+}
+
+TEST_F(Runs, passOnWhatTheReaderOfFeaturesThrows) {
   node_->onGetFeature = [](std::uint8_t) -> Read { throw std::bad_alloc(); };
   options_.reader.features = {{0xE0, 10s}};
   EXPECT_THROW(run(), std::bad_alloc);
