@@ -33,7 +33,6 @@ class DeviceOutput {
   void finish();
 
   const std::string &node() const { return node_; }
-  std::uint64_t reports() const { return reports_; }
   ExitCode exitCode() const { return messages_.exitCode(); }
 
  private:

@@ -34,7 +34,6 @@ class OutputFile {
   /// Gives the file its name; what was written before is on disk then. Throws OutputError.
   void commit();
 
-  const std::string &name() const { return name_; }
   bool isTerminal() const;
 
  private:

@@ -128,6 +128,31 @@ TEST(CaptureFormats, InterfacesOfDifferentLinkTypesAndSnapLengths) {
   EXPECT_THAT(outcome.messages[0].text, HasSubstr("Ethernet"));
 }
 
+TEST(CaptureFormats, MoreInterfacesThanAreRead) {
+  Bytes file = sectionBlock(false);
+  for (int k = 0; k < 65; ++k) file += interfaceBlock(220, false, false);
+  for (const unsigned interface : {64u, 63u}) {
+    file += packetBlock(interface, 1000, record(getReport(3, 0xE0, 7), 220, false), false);
+    file += packetBlock(interface, 2000, record(answer(kSummary), 220, false), false);
+  }
+  const Outcome outcome = readBytes(file);
+  ASSERT_EQ(outcome.reports.size(), 1u);
+  EXPECT_EQ(outcome.reports[0].packet, 4u);
+  ASSERT_THAT(outcome.codes(), ElementsAre("capture-damaged"));
+  EXPECT_EQ(outcome.messages[0].text, "more than 64 USB interfaces in one section; this one is not read");
+}
+
+TEST(CaptureFormats, InterfacesWithoutEndAreDamage) {
+  Bytes file = sectionBlock(false);
+  const Bytes ethernet = interfaceBlock(1, false, false);
+  for (int k = 0; k < 65'537; ++k) file += ethernet;
+  file += interfaceBlock(220, false, false) + packetBlock(65'537, 1000, record(answer(kSummary), 220, false), false);
+  const Outcome outcome = readBytes(file);
+  EXPECT_THAT(outcome.reports, IsEmpty());
+  ASSERT_FALSE(outcome.messages.empty());
+  EXPECT_THAT(outcome.messages[0].text, HasSubstr("more than 65536 interfaces in one section"));
+}
+
 TEST(CaptureFormats, SectionsOfBothByteOrdersJoined) {
   const std::vector<Event> events = {getReport(3, 0xE0, 7), answer(kSummary)};
   const Bytes file = capture(events, {220, false, false, true}) + capture(events, {189, true, true, true});

@@ -206,8 +206,14 @@ TEST(CaptureTransfers, FailuresSayWhatTheyMean) {
     EXPECT_EQ(outcome.messages[0].kind->exitCode, 0);
     EXPECT_THAT(outcome.summary(), HasSubstr("failed reads 1"));
   }
-  const Outcome windows = readEvents({getReport(3, 0xE0, 7), failed(static_cast<std::int32_t>(0xC0000004))}, {249});
-  EXPECT_THAT(windows.messages.at(0).text, HasSubstr("0xC0000004 (stalled"));
+  const std::pair<std::uint32_t, const char *> kWindows[] = {{0xC0000004, "0xC0000004 (stalled"},
+                                                             {0xC0007000, "0xC0007000 (the device is gone)"},
+                                                             {0xC0010000, "0xC0010000 (cancelled)"},
+                                                             {0x80000300, "0x80000300 (refused by the USB driver)"}};
+  for (const auto &[status, text] : kWindows) {
+    const Outcome outcome = readEvents({getReport(3, 0xE0, 7), failed(static_cast<std::int32_t>(status))}, {249});
+    EXPECT_THAT(outcome.messages.at(0).text, HasSubstr(text));
+  }
 }
 
 TEST(CaptureTransfers, ASubmitThatFailsIsAFailure) {

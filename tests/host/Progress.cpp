@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdio>
+#include <thread>
 
 namespace vesk::host {
 namespace {
@@ -31,6 +32,23 @@ TEST(ProgressText, WritesSizesInThreeDigits) {
   EXPECT_EQ(size(9'951), "f  10 kB  0 reports");
   EXPECT_EQ(size(999'500), "f  1.0 MB  0 reports");
   EXPECT_EQ(size(5'000'000'000'000'000), "f  5000 TB  0 reports");
+}
+
+TEST(Progress, IsDrawnNowAndThenInLongRunsAndClearedAtTheEnd) {
+  std::FILE *terminal = std::tmpfile();
+  {
+    Progress progress("f", terminal);
+    std::this_thread::sleep_for(std::chrono::milliseconds(550));
+    for (int k = 0; k < 100; ++k) progress.update(1, 2, 7);
+  }
+  std::rewind(terminal);
+  char shown[200] = {};
+  const std::size_t size = std::fread(shown, 1, sizeof shown, terminal);
+  std::fclose(terminal);
+  const std::string text(shown, size);
+  EXPECT_EQ(text.rfind("\r\x1b[Kf  50% of 2 B  7 reports  ", 0), 0u) << text;
+  EXPECT_EQ(text.substr(text.size() - 4), "\r\x1b[K");
+  EXPECT_LT(size, 100u) << "drawn more than once";
 }
 
 TEST(Progress, IsSilentInShortRuns) {

@@ -44,6 +44,21 @@ TEST(UsbhidDumpInput, ReadsChunksAndTimes) {
   EXPECT_EQ(result.reports[1].timeNs, 2'000'501'000);
 }
 
+TEST(UsbhidDumpInput, LeavesOutInterfacesBeyondTheMostThatItKeepsApart) {
+  std::string text;
+  for (int bus = 1; bus <= 257; ++bus) {
+    char address[16];
+    std::snprintf(address, sizeof address, "%03d:%03d:000", bus / 100 + 1, bus % 100 + 1);
+    text += chunk(kImage, "1290272185.210022", address);
+  }
+  text += chunk(kPacket, "1290272186.210022", "001:002:000");
+  const ReadResult result = readInput(text);
+  EXPECT_EQ(result.reports.size(), 257u) << "256 images, and a packet of the first one";
+  EXPECT_EQ(result.reports.back().bytes, kPacket);
+  ASSERT_EQ(result.messages.size(), 1u);
+  EXPECT_EQ(result.messages[0].code, "too-many-devices");
+}
+
 TEST(UsbhidDumpInput, PutsReportsTogetherForEveryPacketSize) {
   for (const std::size_t size : {8u, 16u, 32u, 64u, 512u, 1024u, 4096u}) {
     SCOPED_TRACE(size);
