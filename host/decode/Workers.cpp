@@ -24,8 +24,8 @@ Workers::Workers(unsigned count, const MakePrinter &makePrinter, Deliver deliver
   for (unsigned i = 1; i < count; ++i) {
     try {
       threads_.emplace_back([this, i] { work(hands_[i]); });
-    } catch (const std::exception &) {  // no thread, or no memory for one
-      break;  // the machine has no more to give; those that run do all the work
+    } catch (const std::exception &) {
+      break;  // no thread, or no memory for one: those that run do all the work
     }
   }
 }

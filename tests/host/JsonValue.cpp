@@ -51,7 +51,7 @@ TEST(JsonValue, dictionariesKeepTheirOrderAndNesting) {
 TEST(JsonValue, emptyOnesAreEmpty) {
   EXPECT_EQ(written(Dictionary(0)), (Written{"{}", ""}));
   EXPECT_EQ(written(std::vector<std::uint32_t>{}), (Written{"[]", ""}));
-  EXPECT_EQ(written(std::string()), (Written{R"("")", ""}));
+  EXPECT_EQ(written(Text(std::string_view())), (Written{R"("")", ""}));
 }
 
 TEST(JsonValue, integersBeyondADoubleAreToldExactly) {
