@@ -182,8 +182,9 @@ TEST_P(Allocation, NothingIsPrintedWhereOneFails) {
   const PaddedReport padded(bytesOf(report));
   const auto plugin = HIDReportVeskPlugin::init();
   const std::int32_t type = report.id == 0x76 || report.id == 0x77 ? 0 : 2;
-  for (const std::size_t n : {1u, 2u}) {
-    bool raised = false;
+  bool raised = true;
+  for (std::size_t n = 1; raised; ++n) {
+    raised = false;
     const std::string printed = test::captureStdout([&] {
       const Armed armed(n);
       try {
@@ -192,8 +193,8 @@ TEST_P(Allocation, NothingIsPrintedWhereOneFails) {
         raised = true;
       }
     });
-    EXPECT_TRUE(raised);
-    EXPECT_EQ(printed, "");
+    EXPECT_EQ(printed.empty(), raised) << "allocation " << n;
+    EXPECT_TRUE(raised || n > 1) << "nothing was allocated";
   }
 }
 

@@ -174,15 +174,12 @@ def check_closed_descriptors(bench):
 
 
 def check_few_threads(bench):
-    """Where the machine gives fewer threads than were asked for, those that it gives do the work."""
+    """Where the machine gives fewer threads than were asked for, those that it gives do the work, and the reading one."""
     whole = bench.run("text", to_file=False).stdout
-    for number in range(2, 9):
+    for number in range(1, 8):
         result = bench.run("text", f"thread {number} {errno.EAGAIN}", jobs="8", to_file=False)
         expect(result.returncode == 0 and result.stdout == whole,
-               f"{number - 1} of 8 threads: {result.returncode} {result.errors}")
-    result = bench.run("text", f"thread 1 {errno.EAGAIN}", jobs="8", to_file=False)
-    expect(result.returncode == 3 and b"vesk-report: error: " in result.stderr,
-           f"no thread at all: {result.returncode} {result.errors}")
+               f"{number - 1} of 7 threads: {result.returncode} {result.errors}")
 
 
 def main():
