@@ -283,6 +283,12 @@ TEST_F(Dispatch, TableThatNamesAnUnknownDecoderRaises) {
   }
 }
 
+TEST_F(Dispatch, UnknownDecoderIsNamedByWhatIsRaised) {
+  plugin->setReportIds({{0xD0, "parseNothing"}});
+  EXPECT_THAT([&] { object("\xD0", 0xD0, 2); },
+              testing::ThrowsMessage<std::invalid_argument>("HIDReportVeskPlugin: no decoder is named parseNothing"));
+}
+
 TEST_F(Dispatch, ResultOutlivesTheReport) {
   ReportResult value = object(std::string("\xD0"
                                           "version\0",

@@ -11,6 +11,7 @@ using test::captureStdout;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::Pair;
+using testing::ThrowsMessage;
 
 using Arguments = std::vector<const char *>;
 
@@ -101,6 +102,15 @@ TEST(Options, TextThatIsNotUtf8RaisesBeforeAnyOptionIsTested) {
     EXPECT_TRUE(plugin->parseArgs(1, arguments + 1));
     EXPECT_TRUE(plugin->displayDecimal());
   }
+}
+
+TEST(Options, WhatIsRaisedSaysWhichArgument) {
+  const auto plugin = HIDReportVeskPlugin::init();
+  const char *arguments[] = {"-decimal", "\xFF", nullptr};
+  EXPECT_THAT([&] { plugin->parseArgs(2, arguments); },
+              ThrowsMessage<std::invalid_argument>("HIDReportVeskPlugin: argument 1 is not UTF-8 text"));
+  EXPECT_THAT([&] { plugin->parseArgs(1, arguments + 2); },
+              ThrowsMessage<std::invalid_argument>("HIDReportVeskPlugin: argument 0 is not UTF-8 text"));
 }
 
 TEST(Options, AbsentArgumentRaises) {
