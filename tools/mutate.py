@@ -12,6 +12,7 @@ that cannot be noticed, with the reason. What survives and is not listed there i
 import argparse
 import collections
 import concurrent.futures
+import fcntl
 import json
 import os
 import pathlib
@@ -67,7 +68,6 @@ class Bench:
         self.workers = threading.local()
         self.numbers = iter(range(1000))
         self.noticed_by = collections.defaultdict(collections.Counter)
-        BUILD.mkdir(parents=True, exist_ok=True)
         self.precompile()
         with concurrent.futures.ThreadPoolExecutor(jobs) as pool:
             list(pool.map(self.compile, self.sources, ["-O0"] * len(self.sources)))
@@ -206,6 +206,9 @@ def main():
         print(*mutants, sep="\n")
         return
     start = time.monotonic()
+    BUILD.mkdir(parents=True, exist_ok=True)
+    lock = (BUILD / "lock").open("w")
+    fcntl.flock(lock, fcntl.LOCK_EX)  # a second run waits
     bench = Bench(options.jobs)
     if options.anew:
         RESULTS.unlink(missing_ok=True)
