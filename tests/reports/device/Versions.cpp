@@ -5,6 +5,7 @@ namespace {
 
 using namespace test;
 using testing::ElementsAre;
+using testing::ThrowsMessage;
 
 Report version(unsigned id, std::string_view text) {
   return Report(id, text.size() + 2).text(1, text);
@@ -120,6 +121,14 @@ TEST(Versions, TextThatIsNotUtf8) {
   }
   EXPECT_THAT(decodeLines(version(0xD0, "\xC3\xA4 \xF0\x9F\x98\x80")), ElementsAre("\xC3\xA4 \xF0\x9F\x98\x80"));
   EXPECT_EQ(decoded(0xD0, false, std::string_view("ok\0\xFF", 4)), " = string ok\n");  // behind the end of the text
+}
+
+TEST(Versions, WhatIsRaisedSaysWhy) {
+  const std::string text = "HIDReportVeskPlugin: the version text is not UTF-8";
+  EXPECT_THAT([] { decodeLines(version(0xD0, "\xFF")); }, ThrowsMessage<std::invalid_argument>(text));
+  EXPECT_THAT([] { decodeValue(version(0xD2, "\xFF")); }, ThrowsMessage<std::invalid_argument>(text));
+  EXPECT_THAT([] { decodeValue(version(0xD2, "1\n2")); },
+              ThrowsMessage<std::out_of_range>("HIDReportVeskPlugin: the extended version has fewer than six lines"));
 }
 
 TEST(Versions, EveryLength) {
