@@ -146,12 +146,16 @@ class Bench:
         folder, path = self.folder(), pathlib.Path(mutant.path)
         (folder / path).parent.mkdir(parents=True)
         (folder / path).write_text(mutant.text)
-        readers = [test for test in self.tests if str(ROOT / path) in self.depends[test]]
-        own = [test for test in readers if test == "tests" / path.with_suffix(".cpp")]
-        # A header's own test instantiates what it declares; most changes end here, without building the core anew.
-        verdict = self.judge_by(own, folder, BUILD)
+        readers = [test for test in self.likely_first(path) if str(ROOT / path) in self.depends[test]]
+        own = [test for test in readers if test.parent == "tests" / path.parent and self.includes(test, path)]
+        # A header's own tests instantiate what it declares; most changes end here, without building the core anew.
+        verdict = self.judge_by([test for test in own if test.stem == path.stem] or own, folder, BUILD)
         verdict = verdict or self.judge_in_core(path, folder)
         return verdict or self.judge_by(readers, folder, folder) or ("survived", "")
+
+    @staticmethod
+    def includes(test, header):
+        return f'#include "{header}"' in (ROOT / test).read_text()
 
     def compile_changed(self, path, folder, file):
         """Compiles `path` as it is with the change."""
