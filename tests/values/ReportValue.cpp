@@ -12,6 +12,7 @@
 namespace {
 
 using testing::ElementsAre;
+using testing::ThrowsMessage;
 using vesk::Dictionary;
 using vesk::EntryAdder;
 using vesk::Text;
@@ -156,6 +157,16 @@ TEST(Dictionary, FullDictionaryRaises) {
   EXPECT_THROW(one.add("B", u8(2)), std::length_error);
   EXPECT_THROW(one.addDictionary("C", 1), std::length_error);
   EXPECT_THAT(keys(one), ElementsAre("A"));
+}
+
+TEST(Dictionary, WhatIsRaisedSaysWhy) {
+  Dictionary none;
+  EXPECT_THAT([&] { none.add("A", u8(1)); },
+              ThrowsMessage<std::length_error>("vesk::Dictionary: more entries than it was given room for"));
+  const ReportValue number = value(u8(1));
+  EXPECT_THAT([&] { number.at("Key"); }, ThrowsMessage<std::out_of_range>("ReportValue: no key Key"));
+  EXPECT_THAT([&] { number.at(std::size_t{0}); },
+              ThrowsMessage<std::out_of_range>("ReportValue: an index into what is no array"));
 }
 
 /// A dictionary of three, two of them with room in the outer block, the last one without.
