@@ -219,6 +219,7 @@ def main():
     is_equivalent = known_equivalents()
     known = known_results(mutants, is_equivalent)
     fresh = [mutant for mutant in mutants if mutant not in known]
+    fresh.sort(key=lambda mutant: is_equivalent(mutant.key))  # last, because all tests run for them
     counts = collections.Counter("equivalent" if verdict == "survived" else verdict for verdict in known.values())
     with concurrent.futures.ThreadPoolExecutor(options.jobs) as pool, RESULTS.open("a") as log:
         for mutant, (verdict, test) in zip(fresh, pool.map(bench.judge, fresh)):
