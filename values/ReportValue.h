@@ -5,7 +5,6 @@
 #include <cstdint>
 #include <iosfwd>
 #include <new>
-#include <string>
 #include <string_view>
 #include <type_traits>
 #include <utility>
@@ -27,10 +26,18 @@ class EntryAdder;
 /// entries too, behind its own, so that a whole tree is one allocation: one for each of the 239 small dictionaries of
 /// the black box configuration took three times as long.
 class Dictionary {
+  /// Entries that belong to an outer dictionary.
+  struct Room {
+    Entry *entries;
+    std::uint32_t capacity;
+  };
+
  public:
   Dictionary() noexcept = default;
   /// Room for `entries` entries, and for `nestedEntries` more that addDictionary() deals out.
   explicit Dictionary(std::size_t entries, std::size_t nestedEntries = 0);
+  /// For addDictionary() alone, since nobody else has a Room.
+  explicit Dictionary(Room room) noexcept : entries_(room.entries), capacity_(room.capacity) {}
   Dictionary(Dictionary &&other) noexcept;
   Dictionary &operator=(Dictionary &&other) noexcept;
   ~Dictionary();
@@ -50,16 +57,6 @@ class Dictionary {
 
  private:
   friend class ::ReportValue;
-  /// Entries that belong to an outer dictionary.
-  struct Room {
-    Entry *entries;
-    std::uint32_t capacity;
-  };
-
- public:
-  explicit Dictionary(Room room) noexcept : entries_(room.entries), capacity_(room.capacity) {}  // of addDictionary()
-
- private:
   template <class... Args>
   Entry &emplace(Key key, Args &&...args);
   Room dealOut(std::size_t entries) noexcept;
