@@ -14,7 +14,8 @@ esac
 tools/build coverage
 folder=build/coverage
 rm -rf "$folder/profiles"
-export LLVM_PROFILE_FILE=$PWD/$folder/profiles/%m-%p.profraw  # from here on every program that runs leaves its counts
+# From here on every program that runs adds its counts to one of eight files.
+export LLVM_PROFILE_FILE=$PWD/$folder/profiles/%8m.profraw
 ctest --test-dir "$folder" --parallel 2 --output-on-failure --no-tests=error --label-exclude kernel \
   --exclude-regex '^(hardening|faults|embedding)' >"$folder/tests.log" 2>&1 </dev/null || { cat "$folder/tests.log" >&2; exit 1; }
 

@@ -354,19 +354,26 @@ TEST_F(Runs, aDeviceThatGoesWhileItIsAskedEndsOnceAndWithoutAFailure) {
 TEST_F(Runs, waitForTheSameDeviceAndNoOther) {
   node_->inputs = {image(1)};
   node_->leaves = true;
-  DeviceIdentity other = controller("/dev/hidraw5", "S2");
+  std::vector<DeviceIdentity> others(6, controller("/dev/hidraw5"));
+  others[0].serial = "S2";
+  others[1].bus = 5;
+  others[2].vendor = 1;
+  others[3].product = 1;
+  others[4].name = "Vesk";
+  others[5].descriptor.pop_back();
   int looked = 0;
   class Returning : public FakeSystem {
    public:
     int *looked = nullptr;
-    DeviceIdentity other;
+    std::vector<DeviceIdentity> others;
     std::vector<DeviceIdentity> list() override {
-      if (++*looked < 3) return {other};
-      return {other, controller("/dev/hidraw7")};
+      std::vector<DeviceIdentity> all = others;
+      if (++*looked >= 3) all.push_back(controller("/dev/hidraw7"));
+      return all;
     }
   } system;
   system.looked = &looked;
-  system.other = other;
+  system.others = others;
   system.onOpen = [&](const std::string &path) -> HidSystem::Opened {
     EXPECT_EQ(path, "/dev/hidraw7");
     if (system.opens == 1) return {nullptr, EACCES};  // the rule has not run yet

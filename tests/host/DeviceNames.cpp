@@ -57,6 +57,10 @@ TEST(ReportDescriptor, itemsHaveZeroOneTwoOrFourBytes) {
   EXPECT_THAT(declared(std::string("\x85\xE0\x27\x85\xE1\xB1\x02", 7)), IsEmpty());
 }
 
+TEST(ReportDescriptor, outputReportsAreNoneOfOurs) {
+  EXPECT_THAT(declared("\x85\xE0\x91\x02\x85\x76\x91\x02"), IsEmpty());
+}
+
 TEST(ReportDescriptor, longItemsArePassedOver) {
   EXPECT_THAT(declared(std::string("\xFE\x03\x11\x85\xE1\xB1\x85\xE0\xB1\x02", 10)), ElementsAre(0xE0));
 }

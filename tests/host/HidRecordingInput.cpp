@@ -135,6 +135,17 @@ TEST(HidRecordingInput, NamesSlips) {
   EXPECT_THAT(result.messages[2].text, HasSubstr("the length were expected"));
 }
 
+TEST(HidRecordingInput, NumbersThatAreTooLargeAreSlips) {
+  const std::string report = "E: 000000.000000 2 de 01\n";
+  for (const std::string line : {"D: 65536", "I: 3 10000 5678", "I: 3 1234 10000", "I: 3 1234"}) {
+    const ReadResult result = readInput("D: 0\n" + line + "\n" + report, "hid-recording");
+    EXPECT_THAT(result.said(), ElementsAre("bad-input 2")) << line;
+    ASSERT_EQ(result.reports.size(), 1u) << line;
+    EXPECT_EQ(result.reports[0].device, "0") << line;
+    EXPECT_EQ(result.reports[0].vendorProduct, std::nullopt) << line;
+  }
+}
+
 TEST(HidRecordingInput, PassesOverUnknownLinesAndSaysSo) {
   const ReadResult result = readInput("N: x\n\nX: 1 2 3\nhello\n  \t\nE: 0.0 1 76\r\n");
   EXPECT_THAT(result.bytes(), ElementsAre("v"));

@@ -44,6 +44,18 @@ TEST(UsbhidDumpInput, ReadsChunksAndTimes) {
   EXPECT_EQ(result.reports[1].timeNs, 2'000'501'000);
 }
 
+TEST(UsbhidDumpInput, LinesThatAreAlmostHeadersAreNone) {
+  for (const std::string header :
+       {"002:003 000:STREAM             1290272185.210022", "002:003:000 STREAM             1290272185.210022",
+        "00x:003:000:STREAM             1290272185.210022", "002:00x:000:STREAM             1290272185.210022",
+        "002:003:00x:STREAM             1290272185.210022", "002:003:000:STREAMS            1290272185.210022",
+        "002:003:000:STREAM             1290272185", "002:003:000:STREAM             1290272185.210022 x"}) {
+    const ReadResult result = readInput(header + "\n DE 01\n\n" + chunk(kImage), "usbhid-dump");
+    EXPECT_THAT(result.bytes(), ElementsAre(kImage)) << header;
+    EXPECT_FALSE(result.messages.empty()) << header;
+  }
+}
+
 TEST(UsbhidDumpInput, LeavesOutInterfacesBeyondTheMostThatItKeepsApart) {
   std::string text;
   for (int bus = 1; bus <= 257; ++bus) {

@@ -42,6 +42,26 @@ TEST(UsbmonTextInput, ReadsTheFormWithoutABus) {
   EXPECT_EQ(result.reports[0].device, "7");
 }
 
+TEST(UsbmonTextInput, LinesThatAreNoEventsGiveNothingAndHideNothing) {
+  for (const std::string line :
+       {"aa 4294967296 C Ci:1:007:0 0 2 = de01", "aa 5 C Xi:1:007:0 0 2 = de01", "aa 5 C Cx:1:007:0 0 2 = de01",
+        "aa 5 C C:1:007:0 0 2 = de01", "aa 5 C Ci:1:x:0 0 2 = de01", "aa 5 C Ci:1:007:x 0 2 = de01",
+        "aa 5 Q Ci:1:007:0 0 2 = de01", "xx 5 C Ci:1:007:0 0 2 = de01"}) {
+    const ReadResult result = readInput(kAsk + line + "\n" + kAnswer, "usbmon-text");
+    EXPECT_THAT(result.bytes(), ElementsAre(kSummary)) << line;
+    EXPECT_FALSE(result.messages.empty()) << line;
+  }
+}
+
+TEST(UsbmonTextInput, RequestsWithImpossibleNumbersAreNone) {
+  for (const std::string setup : {"1a1 01 03de", "a1 101 03de", "a1 01 103de", "a1 01 xx"}) {
+    const ReadResult result =
+        readInput("aa 5 S Ci:1:007:0 s " + setup + " 0000 0002 2 <\naa 6 C Ci:1:007:0 0 2 = de01\n", "usbmon-text");
+    ASSERT_EQ(result.reports.size(), 1u) << setup;
+    EXPECT_TRUE(result.reports[0].typeGuessed) << setup << ": an answer without a request that it knows";
+  }
+}
+
 TEST(UsbmonTextInput, NamesTheLimitOf32Bytes) {
   const ReadResult result = readInput(
       "aa 5 S Ci:1:007:0 s a1 01 03e1 0000 03ff 1023 <\n"
