@@ -124,10 +124,7 @@ void HexTextLine::scan(std::string_view line, std::size_t from) {
       ++at;
       continue;
     }
-    if (line.substr(at, 2) == "\\x") {
-      at += 2;
-      afterSeparator = true;
-    }
+    if (line.substr(at, 2) == "\\x") at += 2;
     std::size_t end = at;
     while (end < line.size() && !endsWord(line[end])) ++end;
     if (end == at) ++end;  // a character that is nothing here
