@@ -22,16 +22,16 @@ constexpr FlagText flagText(unsigned option) {
 
 }  // namespace
 
-constexpr std::array<TextBlock<16>, kLevelMask + 1> kLevelTexts = [] {
+constexpr std::array<TextBlock<16>, kLevelMask + 1> kLevelTexts = []() {
   std::array<TextBlock<16>, kLevelMask + 1> texts;
-  for (std::uint8_t level = 0; level < texts.size(); ++level) {
-    texts[level].append(levelName(level).text());
+  for (std::size_t level = 0; level < texts.size(); ++level) {
+    texts[level].append(levelName(static_cast<std::uint8_t>(level)).text());
     texts[level].append(" ");
   }
   return texts;
 }();
 
-constexpr std::array<FlagText, 32> kFlagTexts = [] {
+constexpr std::array<FlagText, 32> kFlagTexts = []() {
   std::array<FlagText, 32> texts;
   for (unsigned flags = 0; flags < texts.size(); ++flags) texts[flags] = flagText(flags << kFlagShift);
   return texts;
