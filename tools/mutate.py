@@ -146,15 +146,12 @@ class Bench:
         folder, path = self.folder(), pathlib.Path(mutant.path)
         (folder / path).parent.mkdir(parents=True)
         (folder / path).write_text(mutant.text)
-        readers = [test for test in self.likely_first(path) if str(ROOT / path) in self.depends[test]]
-        own = [test for test in readers if test.parent == "tests" / path.parent and self.includes(test, path)]
-        # A header's own tests instantiate what it declares; most changes end here, without building the core anew.
-        verdict = self.judge_by([test for test in own if test.stem == path.stem] or own, folder, BUILD)
-        verdict = verdict or self.judge_in_core(path, folder)
-        return verdict or self.judge_by(readers, folder, folder) or ("survived", "")
+        beside = [test for test in self.likely_first(path) if test.parent == "tests" / path.parent and self.reads(test, path)]
+        # The tests beside a header instantiate what it declares; most changes end here, without building the core anew.
+        return self.judge_by(beside, path, folder) or self.judge_in_core(path, folder) or ("survived", "")
 
     @staticmethod
-    def includes(test, header):
+    def reads(test, header):
         return f'#include "{header}"' in (ROOT / test).read_text()
 
     def compile_changed(self, path, folder, file):
@@ -162,12 +159,13 @@ class Bench:
         changed = folder / path if (folder / path).exists() else ROOT / path
         return run([*CXX, *QUICKLY, f"-I{folder}", f"-I{ROOT}", "-c", changed, "-o", file]).returncode == 0
 
-    def judge_by(self, tests, folder, libraries):
-        """Judges the change of a header by tests that read it."""
+    def judge_by(self, tests, path, folder):
+        """Judges the change of a header by tests that read it, compiled anew, and the core as it was."""
         for test in tests:
-            if not self.compile_changed(test, folder, folder / "own.o") or not self.link_test(folder / "own.o", folder / "own"):
+            if not self.compile_changed(test, folder, folder / "test.o") or not self.link_test(folder / "test.o", folder / "test"):
                 return "compiler", ""
-            if self.fails(test, libraries, folder / "own"):
+            if self.fails(test, BUILD, folder / "test"):
+                self.noticed_by[str(path)][str(test)] += 1
                 return "killed", str(test)
         return None
 
