@@ -146,7 +146,7 @@ class Bench:
         folder, path = self.folder(), pathlib.Path(mutant.path)
         (folder / path).parent.mkdir(parents=True)
         (folder / path).write_text(mutant.text)
-        beside = [test for test in self.likely_first(path) if test.parent == "tests" / path.parent and self.reads(test, path)]
+        beside = [test for test in self.likely_first(path) if self.reads(test, path) and test.parent == "tests" / path.parent]
         # The tests beside a header instantiate what it declares; most changes end here, without building the core anew.
         return self.judge_by(beside, path, folder) or self.judge_in_core(path, folder) or ("survived", "")
 
@@ -162,9 +162,10 @@ class Bench:
     def judge_by(self, tests, path, folder):
         """Judges the change of a header by tests that read it, compiled anew, and the core as it was."""
         for test in tests:
-            if not self.compile_changed(test, folder, folder / "test.o") or not self.link_test(folder / "test.o", folder / "test"):
+            program, test_object = folder / "test", folder / "test.o"
+            if not self.compile_changed(test, folder, test_object) or not self.link_test(test_object, program):
                 return "compiler", ""
-            if self.fails(test, BUILD, folder / "test"):
+            if self.fails(test, BUILD, program):
                 self.noticed_by[str(path)][str(test)] += 1
                 return "killed", str(test)
         return None
