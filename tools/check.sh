@@ -36,18 +36,19 @@ cppcheck() {
     --suppressions-list=tools/cppcheck-suppressions.txt -I. values plugin reports host
 }
 
-# Each step, the minutes that it may take, and the command where it is not a function above.
+# Each step, the minutes that it may take (in all they stay below an hour and a half), and the command where it is not a
+# function above.
 steps() {
   step format 1
   step scripts 1
-  step tests 45
-  step clang 20
-  step tidy 25
-  step cppcheck 10
-  step fuzz 15 tools/fuzz.sh 30
-  step coverage 40 tools/coverage.sh
-  step threads 30 tools/threads.sh
-  step instructions 20 tools/check_instructions
+  step tests 26
+  step clang 10
+  step tidy 12
+  step cppcheck 5
+  step fuzz 8 tools/fuzz.sh 30
+  step coverage 12 tools/coverage.sh
+  step threads 9 tools/threads.sh
+  step instructions 4 tools/check_instructions
 }
 
 wanted=("$@") done=0 passed=0 failed=0
