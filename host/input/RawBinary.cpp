@@ -87,8 +87,17 @@ void readOne(ByteSource &source, FoundReports &found) {
   source.skip(bytes.size());
 }
 
+/// As some systems' shells write text into files. No report has an ID of these bytes.
+bool isUtf16(std::string_view head) {
+  return head.starts_with("\xFF\xFE") || head.starts_with("\xFE\xFF");
+}
+
 void read(ByteSource &source, const ReadOptions &options, ReadSink &sink) {
   FoundReports found(source, options, sink);
+  if (!options.kindForced && isUtf16(source.peek(2))) {
+    found.say(kUnknownInput, {}, "text in UTF-16, which is not read; save it as UTF-8");
+    return;
+  }
   if (!options.kindForced && isText(source.peek(kHeadSize).substr(0, kHeadSize))) {
     found.say(kUnknownInput, {},
               "a text of no known kind; accepted are hex text (as from xxd, hexdump -C, od -An -v -tx1), HID "

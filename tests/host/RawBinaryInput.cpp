@@ -118,6 +118,19 @@ TEST(RawBinaryInput, SaysThatATextIsNoInput) {
   }
 }
 
+TEST(RawBinaryInput, SaysThatTextInUtf16IsNotRead) {
+  for (const std::string_view text : {std::string_view("\xFF\xFE"
+                                                       "E\0000\0",
+                                                       6),
+                                      std::string_view("\xFE\xFF\0E\0000", 6)}) {
+    const ReadResult result = readInput(text);
+    EXPECT_THAT(result.reports, IsEmpty());
+    EXPECT_THAT(result.said(), ElementsAre("unknown-input"));
+    EXPECT_THAT(result.messages[0].text, HasSubstr("UTF-16"));
+    EXPECT_THAT(readInput(text, "raw").bytes(), ElementsAre(text));
+  }
+}
+
 TEST(RawBinaryInput, TakesATextForAReportWhereTheUserSaysSo) {
   EXPECT_THAT(readInput("voice", "raw").bytes(), ElementsAre("voice"));
 }
