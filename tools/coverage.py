@@ -17,7 +17,8 @@ LEAST = {"core lines": 100.0, "core branches": 100.0, "host lines": 95.0}
 
 # Functions that the compiler runs and the program never does. What they make is tested whole.
 COMPILE_TIME = re.compile(r"makeFourDigits|makeThreeHexDigits|parseConversion|optionText|blockSize|TextBlock.*append|"
-                          r"allResolve|isPermutation")
+                          r"allResolve|isPermutation|optionByte|shownByte|flagText|Format.*5kRoomI|layoutSize|"
+                          r"vesk4host12_GLOBAL__N_15knownE")
 # Outcomes that cannot be, each with its reason in docs/TESTING.md.
 IMPOSSIBLE = {("plugin/Options.cpp", "if (!configuration || !configParser(*configuration, &error)) {"),
               ("values/DisplayLines.h", "friend bool operator==(const Iterator &, const Iterator &) = default;")}
@@ -67,6 +68,12 @@ def count_branches(export, skipped):
     return branches
 
 
+def explained():
+    """Branches of the host that one outcome is enough for: tests/uncovered-branches.txt says why."""
+    lines = (ROOT / "tests/uncovered-branches.txt").read_text().splitlines()
+    return {tuple(line.split(": ", 1)) for line in lines if line.startswith("host/")}
+
+
 def source(path, number):
     return (ROOT / path).read_text().splitlines()[number - 1].strip()
 
@@ -76,6 +83,7 @@ def main():
     skipped = run_by_compiler(export)
     lines, branches = count_lines(pathlib.Path(sys.argv[1]), skipped), count_branches(export, skipped)
     show = "--show" in sys.argv[3:]
+    known = explained()
     failed = not lines
     for room in ("core", "host"):
         for what, counts in (("lines", lines), ("branches", branches)):
@@ -83,6 +91,8 @@ def main():
             missed = sorted({key[:2] for key in own if counts[key] == 0})
             if show or room == "core":
                 for path, number in missed:
+                    if what == "branches" and (path, source(path, number)) in known:
+                        continue
                     print(f"{path}:{number}: {'never run' if what == 'lines' else 'one outcome only'}: {source(path, number)}")
             reached = 100.0 * sum(counts[key] != 0 for key in own) / max(1, len(own))
             least = LEAST.get(f"{room} {what}", 0.0)
