@@ -1,5 +1,6 @@
 """The changes that tools/mutate.py makes: one number, operator, character of a string, or statement at a time."""
 
+import collections
 import hashlib
 import pathlib
 import re
@@ -34,10 +35,6 @@ class Mutant:
         self.line = text.count("\n", 0, begin) + 1
         self.before = " ".join(text[first:last].split())
         self.after = " ".join((text[first:begin] + replacement + text[end:last]).split())
-
-    @property
-    def id(self):
-        return hashlib.sha256(f"{self.path}\n{self.text}".encode()).hexdigest()[:16]
 
     @property
     def key(self):
@@ -126,6 +123,10 @@ def mutants_of(path, every):
         found += [Mutant(path, text, *match.span(), replacement) for replacement in replacements]
     for begin, end in sorted(set(statement_spans(text, skipped))):
         found.append(Mutant(path, text, begin, end, ";"))
+    same = collections.Counter()
+    for mutant in found:  # the same line may stand in a file more than once
+        same[mutant.key] += 1
+        mutant.id = f"{mutant.key} #{same[mutant.key]}"
     return found
 
 

@@ -5,7 +5,7 @@ Usage: tools/mutate.sh [--sample N] [--every-character] [--anew] [FILE]...
 Changed are numbers, operators, characters of strings, and statements (which go) of values/, plugin/ and reports/. Each
 source file of the tests becomes a program of its own, linked to the core as a shared library; so a change costs the
 compilation of one file, and the tests that noticed its neighbours run first. What was noticed is kept in
-build/mutate/results.jsonl and not tried again while its file is the same. tests/equivalent-mutants.txt lists changes
+build/mutate/results.jsonl and not tried again while its line is the same. tests/equivalent-mutants.txt lists changes
 that cannot be noticed, with the reason. What survives and is not listed there is printed, and makes it fail.
 """
 
@@ -190,7 +190,7 @@ class Bench:
 def known_results(mutants, is_equivalent):
     """Verdicts of earlier runs. What survived and is not listed is tried again: there may be a test for it now."""
     lines = [json.loads(line) for line in RESULTS.read_text().splitlines()] if RESULTS.exists() else []
-    kept = {line["id"]: line["verdict"] for line in lines}
+    kept = {line["mutant"]: line["verdict"] for line in lines}
     verdicts = {mutant: kept[mutant.id] for mutant in mutants if mutant.id in kept}
     return {mutant: verdict for mutant, verdict in verdicts.items() if verdict != "survived" or is_equivalent(mutant.key)}
 
@@ -222,7 +222,7 @@ def main():
     counts = collections.Counter("equivalent" if verdict == "survived" else verdict for verdict in known.values())
     with concurrent.futures.ThreadPoolExecutor(options.jobs) as pool, RESULTS.open("a") as log:
         for mutant, (verdict, test) in zip(fresh, pool.map(bench.judge, fresh)):
-            log.write(json.dumps({"id": mutant.id, "mutant": str(mutant), "verdict": verdict, "by": test}) + "\n")
+            log.write(json.dumps({"mutant": mutant.id, "verdict": verdict, "by": test}) + "\n")
             log.flush()
             if verdict == "survived" and is_equivalent(mutant.key):
                 verdict = "equivalent"
