@@ -94,6 +94,16 @@ TEST_F(OutputHelpers, FormatsOfTheCallerGoThroughTheCLibrary) {
   EXPECT_THAT(uint32Lines({1, 2}, ""), ElementsAre(""));
 }
 
+TEST_F(OutputHelpers, FormatsThatResembleTheUsualOnes) {
+  EXPECT_THAT(uint32Lines({10, 11}, "%08x |"), ElementsAre("0000000a |0000000b |"));
+  EXPECT_THAT(uint32Lines({10}, "%08x"), ElementsAre("0000000a"));
+  EXPECT_THAT(uint32Lines({10}, "%08x x"), ElementsAre("0000000a x"));
+  EXPECT_THAT(int32Lines({-1}, "%14d  "), ElementsAre("            -1  "));
+  EXPECT_THAT(floatLines({1.5f}, "% -13.3f|"), ElementsAre(" 1.500       |"));
+  EXPECT_THAT(uint32Lines({10}, "-----"), ElementsAre("-----"));  // as long, and another at every character
+  EXPECT_THAT(int32Lines({10}, "%14d-"), ElementsAre("            10-"));
+}
+
 TEST_F(OutputHelpers, RandomValuesAtOddAddressesLikePrintf) {
   std::mt19937 random(5);
   for (int round = 0; round < 2000; ++round) {
