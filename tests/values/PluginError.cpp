@@ -36,6 +36,7 @@ TEST(PluginError, CharactersThatOtherEncodingsCallControlAreWrittenOutByteByByte
   EXPECT_THAT(shown("\xC2\x9F"), HasSubstr("\\xc2\\x9f"));
   EXPECT_THAT(shown("\xC2\xA0"), HasSubstr("\xC2\xA0"));  // a blank that does not break
   EXPECT_THAT(shown("\xE2\x80\xA8\xE2\x80\xA9"), HasSubstr("\\xe2\\x80\\xa8\\xe2\\x80\\xa9"));
+  EXPECT_EQ(shown("\xE2\x80\xA9-"), "D error 1: \\xe2\\x80\\xa9-");  // three bytes, not what follows
   EXPECT_THAT(shown("\xE2\x80\xAA"), HasSubstr("\xE2\x80\xAA"));
   EXPECT_THAT(shown("\xC2"), HasSubstr("\xC2"));  // cut off: nothing is read behind the end
 }
