@@ -43,6 +43,7 @@ TEST(PluginError, CharactersThatOtherEncodingsCallControlAreWrittenOutByteByByte
 
 TEST(PluginError, WithoutAMessage) {
   EXPECT_EQ(PluginError().localizedDescription(), "");
+  EXPECT_EQ(PluginError().code, 0);
   EXPECT_THAT((PluginError{"D", 7, {}}).description(), HasSubstr("7"));
 }
 
