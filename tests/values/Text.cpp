@@ -7,8 +7,15 @@
 #include <type_traits>
 #include <utility>
 
+#include "values/PrintfFormat.h"
+
 namespace vesk {
 namespace {
+
+template <FormatText F>
+concept IsKey = requires { typename std::bool_constant<(Key(F.text), true)>; };
+static_assert(IsKey<" AZ~!#[]"> && IsKey<"}">);
+static_assert(!IsKey<"\x1F"> && !IsKey<"\x7F"> && !IsKey<"\""> && !IsKey<"\\"> && !IsKey<"a\n">);
 
 constexpr Key kWord = "WARNING";
 
