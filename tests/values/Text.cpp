@@ -13,7 +13,9 @@ namespace vesk {
 namespace {
 
 template <FormatText F>
-concept IsKey = requires { typename std::bool_constant<(Key(F.text), true)>; };
+concept IsKey = requires {
+  typename std::bool_constant<(Key(F.text), true)>;
+};
 static_assert(IsKey<" AZ~!#[]"> && IsKey<"}">);
 static_assert(!IsKey<"\x1F"> && !IsKey<"\x7F"> && !IsKey<"\""> && !IsKey<"\\"> && !IsKey<"a\n">);
 
