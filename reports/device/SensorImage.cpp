@@ -38,7 +38,7 @@ constexpr Block kBlocks[] = {
 
 DisplayLines toLines(const HIDReportVeskPlugin &plugin, const Layout &r) {
   const char *format = plugin.displayDecimal() ? "%14d " : "%08x ";
-  DisplayLines out(40, 4096);
+  DisplayLines out(40, 5120);
   out.line<"[Frame # = %u]">(r.frameNumber);
   out.line<"[Frame Params = 0x%08x]">(r.frameParams);
   out.line<"[Timestamp = %u ms]">(r.timestampMs);

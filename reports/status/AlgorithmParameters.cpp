@@ -15,7 +15,7 @@ struct Layout {
 static_assert(sizeof(Layout) == 193);
 
 DisplayLines toLines(const HIDReportVeskPlugin &plugin, const Layout &r, std::string_view title) {
-  DisplayLines out(9, 4096);
+  DisplayLines out(9, 18432);
   out.add(title);
   out.add("");
   plugin.addArrayFloat(out, r.values.data(), kValues, "% -13.3f ");
