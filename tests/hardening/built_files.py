@@ -1,7 +1,7 @@
 #!/usr/bin/env python3
 """The built program and the built plug-in are as hard as their flags say.
 
-Usage: built_files.py READELF (release|other) PROGRAM PLUGIN
+Usage: built_files.py READELF (fortified|other) PROGRAM PLUGIN
 """
 
 import re
@@ -40,7 +40,7 @@ def main():
     symbols, _ = check(PROGRAM)
     check(PLUGIN)
     expect("PIE" in readelf("-d", PROGRAM) or "pie" in readelf("-h", PROGRAM).lower(), "the program is a PIE")
-    if BUILD == "release":
+    if BUILD == "fortified":
         expect(re.search(r"__\w+_chk@", symbols.replace("__stack_chk_fail", "")) is not None,
                "the C library's checked functions are used")
     sys.exit(1 if failures else 0)
