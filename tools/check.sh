@@ -27,7 +27,8 @@ tidy() {
   local sources
   cmake --preset clang >/dev/null &&
     mapfile -t sources < <(git ls-files 'values/*.cpp' 'plugin/*.cpp' 'reports/*.cpp' 'host/*.cpp') &&
-    printf '%s\n' "${sources[@]}" | xargs -P 2 -n 4 clang-tidy-14 -p build/clang --quiet
+    printf '%s\n' "${sources[@]}" | xargs -P 2 -n 4 clang-tidy-14 -p build/clang --quiet 2>&1 |
+    { grep -v ' warnings generated' || true; }  # of headers that are not ours
 }
 
 # What it misreads is listed, with reasons.
