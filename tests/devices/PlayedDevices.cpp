@@ -11,7 +11,6 @@
 //                                   report in hexadecimal a line; "gone", as the last line, takes the device away
 // All other paths and descriptors are left alone.
 #include <dirent.h>
-#include <dlfcn.h>
 #include <fcntl.h>
 #include <linux/hidraw.h>
 #include <poll.h>
@@ -33,12 +32,12 @@
 #include <string>
 #include <string_view>
 
+#include "tests/faults/Overlay.h"
+
 namespace {
 
-template <class Function>
-Function *next(const char *name) {
-  return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
-}
+using test::modeOf;
+using test::next;
 
 constexpr std::string_view kClass = "/sys/class/hidraw", kNode = "/dev/hidraw";
 
@@ -197,10 +196,6 @@ int control(Node &node, unsigned long request, void *argument) {
     default:
       return refuse(EROFS);  // all others write
   }
-}
-
-mode_t modeOf(int flags, va_list arguments) {
-  return (flags & O_CREAT) != 0 ? va_arg(arguments, mode_t) : 0;
 }
 
 }  // namespace

@@ -4,7 +4,6 @@
 // FILE", which lets all succeed and writes "read 17" and so on into FILE at the end. Only the program's own calls are
 // seen, not those that the C library makes for itself.
 #include <dirent.h>
-#include <dlfcn.h>
 #include <fcntl.h>
 #include <poll.h>
 #include <pthread.h>
@@ -21,7 +20,12 @@
 #include <cstdlib>
 #include <cstring>
 
+#include "tests/faults/Overlay.h"
+
 namespace {
+
+using test::modeOf;
+using test::next;
 
 enum Call {
   kOpen,
@@ -79,11 +83,6 @@ Fate fate(Call call) {
   return Fate::kFails;
 }
 
-template <class Function>
-Function *next(const char *name) {
-  return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
-}
-
 __attribute__((destructor)) void writeCounts() {
   if (fault().countFile[0] == '\0') return;
   if (std::FILE *file = std::fopen(fault().countFile, "w")) {
@@ -95,10 +94,6 @@ __attribute__((destructor)) void writeCounts() {
 int openAs(const char *name, const char *path, int flags, mode_t mode) {
   if (fate(kOpen) == Fate::kFails) return -1;
   return next<int(const char *, int, ...)>(name)(path, flags, mode);
-}
-
-mode_t modeOf(int flags, va_list arguments) {
-  return (flags & O_CREAT) != 0 ? va_arg(arguments, mode_t) : 0;
 }
 
 }  // namespace

@@ -15,21 +15,12 @@ import tempfile
 
 sys.path.insert(0, str(pathlib.Path(__file__).resolve().parent.parent / "devices"))
 import played
+from outcomes import FORMS, OLD, expect, finish
 
 CANNOT_RUN = 77
 PROGRAM, LIBRARY = sys.argv[1:3]
-FORMS = {"text": "decode", "json": "decode", "jsonl": "decode", "csv": "decode", "hex": "convert", "raw": "convert",
-         "recording": "convert"}
 BLOCKS = 16  # of 4096 bytes
 REASON = "No space left on device"
-OLD = b"what was there before\n"
-failures = []
-
-
-def expect(holds, what):
-    if not holds:
-        failures.append(what)
-        print("FAILED:", what)
 
 
 class Disk:
@@ -160,8 +151,7 @@ def main():
         bench.close()
         for mounted in (small, none):
             subprocess.run(["umount", str(mounted)], check=True)
-    print(f"{len(failures)} expectations failed")
-    sys.exit(1 if failures else 0)
+    finish()
 
 
 def in_a_namespace():

@@ -13,17 +13,12 @@ import subprocess
 import sys
 import tempfile
 
+from outcomes import expect, finish
+
 PROGRAM, SHIM, EXAMPLES = sys.argv[1:4]
 SESSION = str(pathlib.Path(EXAMPLES) / "session.hid")
 RUNS = (["decode", "--jobs", "1", SESSION], ["decode", "--jobs", "4", SESSION], ["decode", "-o", "json", SESSION],
         ["convert", "-o", "recording", SESSION])
-failures = []
-
-
-def expect(holds, what):
-    if not holds:
-        failures.append(what)
-        print("FAILED:", what)
 
 
 def run(arguments, output, number):
@@ -54,8 +49,7 @@ def main():
     with tempfile.TemporaryDirectory() as folder:
         for arguments in RUNS:
             check(arguments, pathlib.Path(folder) / "out")
-    print(f"{len(failures)} expectations failed")
-    sys.exit(1 if failures else 0)
+    finish()
 
 
 if __name__ == "__main__":

@@ -13,17 +13,9 @@ import subprocess
 import sys
 import tempfile
 
+from outcomes import FORMS, OLD, expect, finish
+
 PROGRAM, SHIM, EXAMPLES = sys.argv[1:4]
-FORMS = {"text": "decode", "json": "decode", "jsonl": "decode", "csv": "decode", "hex": "convert", "raw": "convert",
-         "recording": "convert"}
-OLD = b"what was there before\n"
-failures = []
-
-
-def expect(holds, what):
-    if not holds:
-        failures.append(what)
-        print("FAILED:", what)
 
 
 class Bench:
@@ -196,8 +188,7 @@ def main():
             check_real_places(bench, form)
         check_closed_descriptors(bench)
         check_few_threads(bench)
-    print(f"{len(failures)} expectations failed")
-    sys.exit(1 if failures else 0)
+    finish()
 
 
 if __name__ == "__main__":
