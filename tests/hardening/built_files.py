@@ -1,14 +1,17 @@
 #!/usr/bin/env python3
 """The built program and the built plug-in are as hard as their flags say.
 
-Usage: built_files.py READELF (fortified|other) PROGRAM PLUGIN
+Usage: built_files.py READELF COMPILER COMPILE-COMMANDS PROGRAM PLUGIN
+COMPILER is "unoptimised" for a build in which the C library cannot check anything.
 """
 
+import json
+import pathlib
 import re
 import subprocess
 import sys
 
-READELF, BUILD, PROGRAM, PLUGIN = sys.argv[1:5]
+READELF, COMPILER, COMMANDS, PROGRAM, PLUGIN = sys.argv[1:6]
 failures = []
 
 
@@ -40,7 +43,14 @@ def main():
     symbols, _ = check(PROGRAM)
     check(PLUGIN)
     expect("PIE" in readelf("-d", PROGRAM) or "pie" in readelf("-h", PROGRAM).lower(), "the program is a PIE")
-    if BUILD == "fortified":
+    if COMPILER != "unoptimised":
+        commands = [entry for entry in json.loads(pathlib.Path(COMMANDS).read_text())
+                    if re.search(r"/(values|plugin|reports|host)/", entry["file"]) and "/tests/" not in entry["file"]]
+        expect(len(commands) > 80, "the commands of the product's sources are there")
+        for entry in commands:
+            expect("-D_FORTIFY_SOURCE=2" in entry["command"] and "-D_GLIBCXX_ASSERTIONS" in entry["command"],
+                   f"{entry['file']} is compiled with the checks of both libraries")
+    if COMPILER == "GNU":  # clang 14 leaves none, because it knows all sizes or none
         expect(re.search(r"__\w+_chk@", symbols.replace("__stack_chk_fail", "")) is not None,
                "the C library's checked functions are used")
     sys.exit(1 if failures else 0)
