@@ -3,7 +3,6 @@
 
 #include <stdio_ext.h>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstring>
 
@@ -12,8 +11,7 @@ namespace vesk::host {
 ssize_t CaptureHandle::give(void *self, char *out, std::size_t size) {
   auto &handle = *static_cast<CaptureHandle *>(self);
   if (handle.first_.empty()) std::swap(handle.first_, handle.second_);
-  const std::size_t count = std::min(size, handle.first_.size());
-  if (count != 0) std::memcpy(out, handle.first_.data(), count);
+  const std::size_t count = handle.first_.copy(out, size);
   handle.first_.remove_prefix(count);
   return static_cast<ssize_t>(count);
 }

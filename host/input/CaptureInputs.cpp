@@ -12,8 +12,8 @@ namespace {
 constexpr std::size_t kLargePiece = 64;
 
 /// Whether a transfer of this size may be the first piece of a report, which is to say, filled the buffer it had.
-bool mayBePiece(std::size_t size, const UsbEndpoint *endpoint) {
-  if (endpoint != nullptr && endpoint->packetSize != 0) return size % endpoint->packetSize == 0;
+bool mayBePiece(std::size_t size, const UsbEndpoint &endpoint) {
+  if (endpoint.packetSize != 0) return size % endpoint.packetSize == 0;
   return size >= 8 && std::has_single_bit(size);
 }
 
@@ -83,7 +83,7 @@ void CaptureReports::inputOfKnownId(const KnownReport &known, const UsbPacket &u
   UsbDevice &device = devices_.get(interface_, usb);
   UsbEndpoint &endpoint = device.endpoint(usb.endpoint);
   const std::size_t size = usb.data.size();
-  if (size < known.layoutSize && mayBePiece(size, &endpoint)) {
+  if (size < known.layoutSize && mayBePiece(size, endpoint)) {
     endpoint.assembly.begin(known, usb.data, number_, timeNs_);
     return;
   }

@@ -14,9 +14,9 @@ LayoutRefusal refuse(const MessageKind &kind, const std::string &what) {
   return {&kind, what + "; print them with 'xxd', 'hexdump -C' or 'od -Ax -v -tx1'"};
 }
 
-bool isReportId(std::string_view digits, int base) {
-  const auto id = parseNumber(digits, base);
-  return id && *id <= 0xFF && findReport(static_cast<std::uint32_t>(*id)) != nullptr;
+/// Of eight binary digits.
+bool areReportId(std::string_view bits) {
+  return findReport(static_cast<std::uint32_t>(parseNumber(bits, 2).value_or(0))) != nullptr;
 }
 
 bool consistsOf(std::string_view text, std::string_view characters) {
@@ -53,7 +53,7 @@ std::optional<LayoutRefusal> refuseLayout(const HexTextLine &line, bool isFirst)
 
   if (digits == 8 && isFirst && allConsistOf("01")) {
     const std::string_view text = line.textColumn();
-    if (colon ? text.empty() || text.size() == fields.size() - 1 : several && isReportId(fields[first].digits, 2))
+    if (colon ? text.empty() || text.size() == fields.size() - 1 : several && areReportId(fields[first].digits))
       return refuse(kBitText, "the bytes are written as bits, as from 'xxd -b'");
   }
   if (colon) return {};
@@ -65,7 +65,7 @@ std::optional<LayoutRefusal> refuseLayout(const HexTextLine &line, bool isFirst)
     return refuse(kDecimalText, "the bytes are written as decimal words, as from 'hexdump -d'");
   if ((digits == 4 || digits == 8 || digits == 16) && !fields[first].prefixed) {
     const bool swappedId =
-        isFirst && several && !isReportId(front.substr(0, 2), 16) && isReportId(front.substr(front.size() - 2), 16);
+        isFirst && several && !beginsReport(front) && beginsReport(front.substr(front.size() - 2));
     if (offset || swappedId)
       return refuse(kSwappedWords,
                     "the bytes stand in words, swapped as on most machines, as from 'hexdump' without -C or 'od -tx2'");
@@ -83,8 +83,7 @@ std::optional<LayoutRefusal> refuseSwappedText(const HexTextLine &line, std::str
                                                 blank % 2 == 0 && consistsOf(text.substr(0, blank), "0123456789abcdef"))
     text.remove_prefix(std::min(text.find_first_not_of(' ', blank), text.size()));
   const std::size_t whole = bytes.size() / group * group;
-  if (whole == 0 ||
-      !shows(text, whole, [&](std::size_t i) { return bytes[i / group * group + group - 1 - i % group]; }))
+  if (!shows(text, whole, [&](std::size_t i) { return bytes[i / group * group + group - 1 - i % group]; }))
     return {};
   return refuse(kSwappedWords, "the text column shows that the bytes of each group are swapped, as from 'xxd -e'");
 }

@@ -41,6 +41,10 @@ std::string quoted(std::string_view word) {
 
 }  // namespace
 
+bool beginsReport(std::string_view digits) {
+  return findReport(static_cast<std::uint32_t>(parseNumber(digits.substr(0, 2), 16).value_or(0))) != nullptr;
+}
+
 void HexTextLine::reset() {
   fields_.clear();
   hasLabel_ = opensArray_ = colonOffset_ = parted_ = sawComment_ = false;
@@ -198,11 +202,8 @@ bool HexTextLine::dataBehindLabel(std::string_view line) {
     if (words_ != 0 || fields_.empty()) continue;
     if (hasBrace && *from == brace) return true;
     // A number behind a word need not be a report: "length: 64".
-    const Field &first = fields_[0];
-    const auto id = parseNumber(first.digits.substr(0, 2), 16);
-    if (!colonOffset_ && id && findReport(static_cast<std::uint32_t>(*id)) != nullptr &&
-        (fields_.size() > 1 || first.digits.size() >= 14))
-      return true;
+    const std::string_view first = fields_[0].digits;
+    if (!colonOffset_ && beginsReport(first) && (fields_.size() > 1 || first.size() >= 14)) return true;
   }
   return false;
 }

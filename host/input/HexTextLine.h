@@ -8,6 +8,9 @@
 
 namespace vesk::host {
 
+/// Whether hex digits begin with the byte of a report ID that is known.
+bool beginsReport(std::string_view digits);
+
 class HexTextLine {
  public:
   enum class Kind {

@@ -19,10 +19,6 @@ unsigned byteAt(std::string_view bytes, std::size_t at) {
   return static_cast<unsigned char>(bytes[at]);
 }
 
-bool isKnown(unsigned id) {
-  return findReport(id) != nullptr;
-}
-
 bool consistsOf(std::string_view text, std::string_view characters) {
   return text.find_first_not_of(characters) == std::string_view::npos;
 }
@@ -68,9 +64,8 @@ bool HexTextReport::endsBefore(const HexTextLine &line) const {
   if (allRuns_ && line.isRun() && !line.hasColonOffset()) return !continuesRun(line);
   if (rows_.size() != 1 || rows_[0].colon || !rows_[0].offset.empty()) return false;
   const KnownReport *known = findReport(byteAt(data_, 0));
-  const auto next = parseNumber(line.fields()[0].digits.substr(0, 2), 16);
-  return known != nullptr && known->length != KnownReport::Length::kText && data_.size() == known->layoutSize && next &&
-         isKnown(static_cast<unsigned>(*next));
+  return known != nullptr && known->length != KnownReport::Length::kText && data_.size() == known->layoutSize &&
+         beginsReport(line.fields()[0].digits);
 }
 
 /// Runs of digits are one report in lines of equal length, the last of which may be shorter, or one report a line. They
@@ -82,8 +77,7 @@ bool HexTextReport::continuesRun(const HexTextLine &line) const {
   const std::size_t count = digits / 2;
   if (!equalRuns_ || count > runBytes_) return false;
   const KnownReport *known = findReport(byteAt(data_, 0));
-  const auto next = parseNumber(line.fields()[0].digits.substr(0, 2), 16);
-  const bool beginsKnown = next && isKnown(static_cast<unsigned>(*next));
+  const bool beginsKnown = beginsReport(line.fields()[0].digits);
   if (known != nullptr && known->length == KnownReport::Length::kText) {
     const bool whole = data_.find('\0', 1) != std::string::npos;
     return !whole || (runBytes_ == kPlainRun && !beginsKnown);
@@ -147,7 +141,7 @@ std::size_t HexTextReport::rowEnd(std::size_t row) const {
 }
 
 void HexTextReport::finish() {
-  if (problem_ || rows_.empty()) return;
+  if (problem_) return;
   if (hasOffsets())
     joinByOffsets();
   else

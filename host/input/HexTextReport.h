@@ -24,7 +24,7 @@ class HexTextReport {
 
   void clear();
   /// No line was added since clear().
-  bool isEmpty() const { return rows_.empty() && !repeatAt_ && !problem_; }
+  bool isEmpty() const { return rows_.empty() && !problem_; }
   std::uint64_t firstLine() const { return firstLine_; }
 
   /// Whether a data line begins another report than the one that is being gathered.
@@ -34,7 +34,7 @@ class HexTextReport {
   /// Gives the report up; the first problem stays.
   void fail(const MessageKind &kind, std::uint64_t number, std::string text);
 
-  /// Puts the report together into bytes(), or leaves a problem.
+  /// Puts the report together into bytes(), or leaves a problem. REQUIRES: !isEmpty().
   void finish();
   const std::string &bytes() const { return bytes_; }
   const std::optional<Problem> &problem() const { return problem_; }

@@ -22,7 +22,7 @@ enum BlockType : std::uint32_t {
 
 constexpr std::uint64_t kSmallestBlock = 12;  // type, length, and the length once more
 constexpr std::size_t kSectionHeaderSize = 28;
-constexpr std::size_t kMostInterfaceBlock = 64 << 10;
+constexpr std::size_t kLeastInterfaceBlock = 20, kMostInterfaceBlock = 64 << 10;
 constexpr std::size_t kMostInterfaces = 65536, kMostHandles = 64;  // in a section
 constexpr std::size_t kPacketHeadSize = 12;                        // type, length, and the interface's number
 
@@ -76,7 +76,7 @@ bool PcapngFile::nextBlock(CapturedPacket &packet) {
   const std::uint64_t size = number32(source_.peek(8), 4, bigEndian_);
   if (size < (isSection ? kSectionHeaderSize : kSmallestBlock) || size % 4 != 0)
     return damaged("a block claims a length of " + std::to_string(size) + " bytes, which no block has");
-  if (type == kInterfaceDescription && size > kMostInterfaceBlock)
+  if (type == kInterfaceDescription && (size < kLeastInterfaceBlock || size > kMostInterfaceBlock))
     return damaged("an interface is described in " + std::to_string(size) + " bytes");
   if (isPacket(type) && size > kMostRecord) {
     good_ = passOverPacket(size);
@@ -126,9 +126,9 @@ void PcapngFile::addInterface(std::string_view block) {
   }
   Interface &added = interfaces_.emplace_back();
   added.number = interfacesBefore_ + static_cast<unsigned>(interfaces_.size()) - 1;
-  added.linkType = block.size() < 20 ? -1 : number16(block, 8, bigEndian_);
+  added.linkType = number16(block, 8, bigEndian_);
   if (!isUsbLinkType(added.linkType)) {
-    if (added.linkType >= 0) others_[added.linkType] += 0;
+    others_[added.linkType] += 0;
     return;
   }
   hasUsb_ = true;

@@ -177,6 +177,16 @@ TEST(CaptureFormats, SimpleObsoleteAndUnknownBlocks) {
   EXPECT_THAT(outcome.codes(), IsEmpty());
 }
 
+TEST(CaptureFormats, JournalEntriesAreNumbered) {
+  const Bytes submit = record(getReport(3, 0xE0, 7), 220, false), complete = record(answer(kSummary), 220, false);
+  const Outcome outcome = readBytes(sectionBlock(false) + interfaceBlock(220, false, false) +
+                                    packetBlock(0, 0, submit, false) + block(9, Bytes(8, 'x'), false) +
+                                    packetBlock(0, 0, complete, false));
+  ASSERT_THAT(outcome.bytes(), ElementsAre(kSummary));
+  EXPECT_EQ(outcome.reports[0].packet, 3u);
+  EXPECT_THAT(outcome.codes(), IsEmpty());
+}
+
 TEST(CaptureFormats, APacketWithoutATimeHasNone) {
   const Bytes submit = record(getReport(3, 0xE0, 7), 220, false), complete = record(answer(kSummary), 220, false);
   Bytes file = sectionBlock(false) + interfaceBlock(220, false, false) + packetBlock(0, 1000, submit, false);
@@ -245,13 +255,21 @@ TEST(CaptureFormats, LengthsThatLie) {
   ASSERT_THAT(huge.codes(), ElementsAre("capture-cut"));
   EXPECT_THAT(huge.messages[0].text, HasSubstr("of a record of 4294967311 bytes only 116 are there"));
 
-  // More than libpcap takes for this link type, and all of it there: passed over, and the next packet is read.
+  // More than is given to libpcap, and all of it there: passed over, and the next packet is read.
   const Bytes large = pcap.packet(Bytes(std::size_t{1} << 20, 'x'), kStartNs);
   const Outcome tooLarge = readBytes(before + large + before.substr(24));
   EXPECT_EQ(tooLarge.reports.size(), 2u);
   EXPECT_EQ(tooLarge.reports.back().packet, 5u);
   EXPECT_THAT(tooLarge.codes(), ElementsAre("packet-too-large"));
   EXPECT_EQ(tooLarge.messages[0].place.number, 3u);
+}
+
+TEST(CaptureFormats, ACutRecordOfAnotherLinkTypeIsTold) {
+  const Form form{1};
+  const Bytes file = form.head() + form.packet(Bytes(60, 'x'), kStartNs) + form.packet(Bytes(60, 'x'), kStartNs);
+  const Outcome outcome = readBytes(file.substr(0, file.size() - 1));
+  EXPECT_THAT(outcome.codes(), ElementsAre("capture-cut", "unsupported-capture"));
+  EXPECT_THAT(outcome.messages[0].text, HasSubstr("behind packet 1:"));
 }
 
 TEST(CaptureFormats, BlocksThatLie) {
@@ -269,6 +287,7 @@ TEST(CaptureFormats, BlocksThatLie) {
   EXPECT_THAT(outcomeOf(Writer(false).u32(6).u32(32).bytes(Bytes(20, 'x')).u32(36).done()), HasSubstr("32 and 36"));
   EXPECT_THAT(outcomeOf(block(0x0A0D0D0A, Bytes(16, 'x'), false)), HasSubstr("byte order"));
   EXPECT_THAT(outcomeOf(block(1, Bytes(100'000, 'x'), false)), HasSubstr("described in 100012 bytes"));
+  EXPECT_THAT(outcomeOf(block(1, Bytes(4, '\0'), false)), HasSubstr("described in 16 bytes"));
 }
 
 TEST(CaptureFormats, OnePacketThatLiesDoesNotHideTheNext) {
@@ -277,6 +296,7 @@ TEST(CaptureFormats, OnePacketThatLiesDoesNotHideTheNext) {
   Writer lying(false);  // announces more data than the block holds
   lying.u32(0).u32(0).u32(0).u32(100'000).u32(100'000).bytes(submit);
   const Bytes bad[] = {block(6, lying.done(), false), packetBlock(5, 0, submit, false), block(6, Bytes(4, '\0'), false),
+                       block(6, {}, false), block(2, {}, false),
                        packetBlock(0, 0, submit.substr(0, 40), false), packetBlock(0, 0, {}, false)};
   for (const Bytes &block : bad) {
     const Outcome outcome =

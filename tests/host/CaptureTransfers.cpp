@@ -8,6 +8,7 @@ namespace {
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
+using ::testing::Not;
 using vesk::host::ReportType;
 
 constexpr std::uint64_t kFirst = 0xFFFF888100000001, kSecond = 0xFFFF888100000040;
@@ -172,6 +173,28 @@ TEST(CaptureTransfers, WithoutARequestDescriptorsAreNotTakenForReports) {
   EXPECT_THAT(readEvents({answer(deviceDescriptor(1, 2)), answer(hexBytes("0102"))}).reports, IsEmpty());
 }
 
+TEST(CaptureTransfers, WithoutARequestOnlyWholeAnswersOfAKnownIdAreTaken) {
+  Event refused = answer(kSummary), written = answer(kSummary), cut = answer(pattern(0xE3, 10));
+  refused.status = -32;
+  written.endpoint = 0x00;
+  cut.transferred = 57;
+  for (const Event &event : {refused, written, answer({}), answer(hexBytes("01")), answer(hexBytes("0203"))}) {
+    const Outcome outcome = readEvents({event});
+    EXPECT_THAT(outcome.codes(), ElementsAre("no-reports"));
+    EXPECT_THAT(outcome.summary(), HasSubstr("packets of other traffic 1"));
+  }
+  const Outcome outcome = readEvents({cut});
+  ASSERT_THAT(outcome.codes(), ElementsAre("cut-data", "no-reports"));
+  EXPECT_THAT(outcome.messages[0].text, HasSubstr("10 of the 57 bytes"));
+}
+
+TEST(CaptureTransfers, OnlyReadsOfKnownReportsAreMissed) {
+  // Without their answers: a descriptor, a report of another device, a written report.
+  EXPECT_THAT(readEvents({descriptorRequest(1, 18)}).codes(), ElementsAre("no-reports"));
+  EXPECT_THAT(readEvents({getReport(3, 0x01, 8)}).codes(), ElementsAre("no-reports"));
+  EXPECT_THAT(readEvents({setReport(0xE0, kSummary)}).codes(), ElementsAre("no-reports"));
+}
+
 TEST(CaptureTransfers, AnotherDevicesAnswerIsNotTheRequests) {
   Event fromAnother = answer(kState);
   fromAnother.device = 8;
@@ -264,6 +287,10 @@ TEST(CaptureTransfers, WrittenReportsAreCounted) {
     EXPECT_THAT(outcome.codes(), IsEmpty());
     EXPECT_THAT(outcome.summary(), HasSubstr("SET_REPORTs (not decoded) 1"));
   }
+  Event setIdle;
+  setIdle.endpoint = 0x00;
+  setIdle.setup = setupBytes(0x21, 0x0A, 0, 0, 0);
+  EXPECT_THAT(readEvents({setIdle}).summary(), Not(HasSubstr("SET_REPORT")));
 }
 
 TEST(CaptureTransfers, OlderUsbpcapWritesThreeStages) {
@@ -288,6 +315,18 @@ TEST(CaptureTransfers, OlderUsbpcapWritesThreeStages) {
   const Outcome written = readEvents({setup, outData, outStatus}, {249});
   EXPECT_THAT(written.reports, IsEmpty());
   EXPECT_THAT(written.codes(), ElementsAre("no-reports"));
+}
+
+TEST(CaptureTransfers, UsbpcapWithoutAStageTellsTheDirectionInItsInfo) {
+  const Form form{249};
+  Bytes submit = usbpcapRecord(getReport(3, 0xE0, 7)), complete = usbpcapRecord(answer(kSummary));
+  for (Bytes *bytes : {&submit, &complete}) {
+    (*bytes)[0] = 27;
+    bytes->erase(27, 1);
+  }
+  const Outcome outcome = readBytes(form.head() + form.packet(submit, 0) + form.packet(complete, 0));
+  ASSERT_THAT(outcome.bytes(), ElementsAre(kSummary));
+  EXPECT_TRUE(outcome.reports[0].typeGuessed);  // the request stands in the setup stage alone
 }
 
 TEST(CaptureTransfers, InputReportsFromInterrupts) {
@@ -355,6 +394,14 @@ TEST(CaptureTransfers, DescriptorsMayBeCutOrWrong) {
     ASSERT_EQ(outcome.reports.size(), 1u);
     EXPECT_EQ(outcome.reports[0].vendorProduct, size < 12 ? 0u : 0x1234ABCDu);
   }
+  Event refused = answer(device);
+  refused.status = -32;
+  Bytes ofAnotherType = device;
+  ofAnotherType[1] = 2;
+  for (const Event &event : {refused, answer(ofAnotherType)}) {
+    const Outcome outcome = readEvents({descriptorRequest(1, 18), event, getReport(3, 0xE0, 7), answer(kSummary)});
+    EXPECT_EQ(outcome.reports.at(0).vendorProduct, 0u);
+  }
   for (int value = 0; value < 256; ++value)
     for (std::size_t at = 0; at < all.size(); ++at) {
       Bytes wrong = all;
@@ -366,6 +413,7 @@ TEST(CaptureTransfers, DescriptorsMayBeCutOrWrong) {
 TEST(CaptureTransfers, AnUnknownIdOnOurDeviceIsHandedOver) {
   const std::vector<Event> unknown = {getReport(3, 0xC1, 4), answer(hexBytes("C1010203"))};
   EXPECT_THAT(readEvents(unknown).reports, IsEmpty());
+  EXPECT_THAT(readEvents(probed({3}, 64) + unknown).reports, IsEmpty());  // known, but not as ours
   const Outcome outcome = readEvents(std::vector{getReport(3, 0xDE, 2), answer(kState)} + unknown);
   ASSERT_EQ(outcome.reports.size(), 2u);
   EXPECT_EQ(outcome.reports[1].id, 0xC1u);
@@ -450,6 +498,25 @@ TEST(CaptureTransfers, APieceThatTheCaptureCutEndsTheReport) {
   const Outcome outcome = readEvents(events + pieces(kPacket, 64));
   EXPECT_THAT(outcome.bytes(), ElementsAre(kPacket));
   EXPECT_EQ(outcome.codes().at(0), "cut-data");
+}
+
+TEST(CaptureTransfers, SmallPiecesWithoutAnEndAreNotTakenForOurs) {
+  const Event joystick = inputData(hexBytes("7680008000000000"));
+  const Outcome outcome = readEvents({joystick, inputData(hexBytes("0102"))});
+  EXPECT_THAT(outcome.codes(), ElementsAre("no-reports"));
+  EXPECT_THAT(outcome.summary(), HasSubstr("packets of other traffic 2"));
+  // Where the device is known to be the controller it is told.
+  EXPECT_THAT(readEvents(std::vector{getReport(3, 0xDE, 2), answer(kState), joystick}).codes(),
+              ElementsAre("incomplete-report"));
+}
+
+TEST(CaptureTransfers, ACutInputOfAnUnknownIdIsOursWhereTheEndpointIs) {
+  Event cut = inputData(hexBytes("1102"));
+  cut.transferred = 100;
+  EXPECT_THAT(readEvents({cut}).codes(), ElementsAre("no-reports"));
+  const Outcome outcome = readEvents({inputData(kImage), cut});
+  ASSERT_THAT(outcome.codes(), ElementsAre("cut-data"));
+  EXPECT_EQ(outcome.messages[0].reportId, std::nullopt);
 }
 
 TEST(CaptureTransfers, ThePendingTableIsBounded) {

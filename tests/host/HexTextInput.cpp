@@ -1,4 +1,5 @@
 // Hex text: every layout of the same bytes as the tools print it, the traps in them, and what is refused.
+#include "host/input/HexTextLine.h"
 #include "tests/host/ReadInput.h"
 
 namespace test {
@@ -111,6 +112,7 @@ TEST(HexTextInput, ReadsPlainDigitsInEverySpelling) {
                            "e00d0500214024",
                            "e00d 0500 2140 24",
                            "0xE0 0x0D 0x05 0x00 0x21 0x40 0x24",
+                           "0XE0 0X0D 0X05 0X00 0X21 0X40 0X24",
                            "0xe00d0500214024",
                            "e0,0d,05,00,21,40,24",
                            "e0, d, 5, 0, 21, 40, 24",
@@ -126,9 +128,14 @@ TEST(HexTextInput, ReadsPlainDigitsInEverySpelling) {
                            "e0 0d /* severity */ 05 00\n/* two\nlines */ 21 40 24",
                            "const uint8_t report[7] = { 0xe0, 0x0d, 0x05, 0x00, 0x21, 0x40, 0x24 };",
                            "Report: e0 0d 05 00 21 40 24",
+                           "Report = e00d0500214024",
+                           "dump = 00000000: e00d 0500 2140 24",
+                           "{\"report\": \"e0 0d 05 00 21 40 24\"}",
                            "  \"usb.capdata\": \"e0:0d:05:00:21:40:24\",",
                            "report (size 7) (numbered) = e0 0d 05 00 21 40 24",
                            "> e0 0d 05 00\n> 21 40 24\n",
+                           "e0 0d 05 00 21 40 24 |.e0..!@$|",
+                           "e0 0d 05 00 21 40 24 >.e0..!@$<",
                            "0000   e0 0d 05 00 21 40 24                              ....!@$\n",
                            "E0 0D 05 00\n21 40\n24\n"})
     expectOne(text, kSummary);
@@ -142,6 +149,25 @@ Closing device
 )",
             kSummary);
   expectOne("\t0x0000:  e00d 0500 2140 24                        ....!@$\n", kSummary);
+}
+
+TEST(HexTextInput, ANumberBehindWordsNeedNotBeAReport) {
+  for (const char *label : {"Length of report: 76", "Its ID is: 0xde", "Feature report e0: 64 bytes long"})
+    expectOne(std::string(label) + "\ne0 0d 05 00 21 40 24\n", kSummary);
+}
+
+TEST(HexTextInput, ABMayBeABeginningOfBytes) {
+  expectOne("b e0 05\n", bytesOf("0be005"));  // and not Python's b'...' or b"..."
+}
+
+TEST(HexTextInput, TheFirstFieldIsNoOffsetWithoutBytesOfTwoDigits) {
+  vesk::host::HexTextLine line;
+  line.parse("00000010 e00d 0500");
+  EXPECT_FALSE(line.mayHaveOffset());
+  line.parse("00000010 e0 0d");
+  EXPECT_TRUE(line.mayHaveOffset());
+  line.parse("no fields");
+  EXPECT_FALSE(line.mayHaveOffset());
 }
 
 TEST(HexTextInput, CutsTheTextColumnByItsPlace) {
@@ -175,6 +201,10 @@ TEST(HexTextInput, TakesAFieldForAnOffsetOnlyWhereTheOffsetsGrow) {
   const ReadResult result = readInput("e00d0500 21 40\n24000000 01 02\n");
   EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("e00d0500214024000000 0102")));
   EXPECT_THAT(readInput("00000010 e0 21\n00000012 22 23\n").bytes(), ElementsAre(bytesOf("e0212223")));
+  expectOne("e00d0500 21 40 24\n", kSummary);
+  // In base 10 the second one is no number at all.
+  expectOne("00000010 e0 21\n0000000a 22 23\n", bytesOf("00000010e0210000000a2223"));
+  expectOne("e0 0d 05 00\n0000 21 40\n", bytesOf("e00d050000002140"));
   expectOne("00000000: e00d 0500 2140 24\n", kSummary);
 }
 
@@ -223,9 +253,18 @@ TEST(HexTextInput, TakesTheLengthFromTheLastOffset) {
             bytesOf("e1000000000000000000000000000000") + std::string(48, '\xff'));
 }
 
+TEST(HexTextInput, AReportThatIsGivenUpEndsLikeAnyOther) {
+  // The first problem is told, not what follows from it.
+  EXPECT_THAT(readInput("e0 021\n2g 05 00 01\n*\n\nde 01\n").said(), ElementsAre("bad-input 1"));
+  // Both dumps are refused, for the second begins at zero again.
+  EXPECT_THAT(readInput("0000000 0de0 0005 4021 0024\n0000007\n0000000 01de 0000\n0000003\n", "hex").said(),
+              ElementsAre("swapped-words 1", "swapped-words 3"));
+}
+
 TEST(HexTextInput, RefusesSqueezedLinesWithoutAnEnd) {
   expectRefused("000000 e1 00 00 00\n*\n", "bad-input", "length is unknown", "2", 4);
   expectRefused(" e1 00 00 00\n*\n 00 01\n", "bad-input", "od -An -v -tx1", "3", 4);
+  expectRefused(" e1 00 00 00\n*\n 00 01\n*\n 02 03\n", "bad-input", "od -An -v -tx1", "3", 4);
   expectRefused("*\ne1 00\n", "bad-input", "none before it", "1", 4);
   expectRefused("000000 e1 00 00 00\n*\n000007\n", "bad-input", "whole number of lines", "3", 4);
 }
@@ -243,6 +282,9 @@ TEST(HexTextInput, SeesMissingLines) {
   expectRefused("00000000  76 20 21 22\n00000008  2f 30\n", "bad-input", "was expected", "2", 4);
   expectRefused("0000000 76 20 21 22\n0000014 2f 30\n", "bad-input", "0000014 where 0000004 was expected", "2", 4);
   expectRefused("00000000: 7620\n2122\n", "bad-input", "an offset was expected", "2", 4);
+  expectRefused("e00d05\n00000003:\n", "bad-input", "an offset, but the lines before it have none", "2", 4);
+  expectRefused("0000000a: e0 0d\n0000000f: 05\n", "bad-input", "0000000f where 0000000c was expected", "2", 4);
+  expectRefused("000000a e0 0d\n", "bad-input", "\"000000a\" is no offset", "1", 4);
 }
 
 TEST(HexTextInput, RefusesWordsByName) {
@@ -252,14 +294,19 @@ TEST(HexTextInput, RefusesWordsByName) {
   expectRefused("0000000    2076    2221    2423    2625    2827    2a29    2c2b    2e2d\n0000010\n", "swapped-words",
                 "xxd");
   expectRefused("0000000 22212076 26252423 2a292827 2e2d2c2b\n0000020\n", "swapped-words", "xxd");
+  expectRefused("0000000 0024402100050de0\n0000007\n", "swapped-words", "xxd");
   expectRefused("00000000: 00050de0   244021                    ....!@$\n", "swapped-words", "'xxd -e'");
   expectRefused("00000000: 22212076 26252423 2a292827 2e2d2c2b  v !\"#$%&'()*+,-.\n", "swapped-words", "'xxd -e'");
   expectRefused("00000000: 2076 2221 2423 2625 2827 2a29 2c2b 2e2d  v !\"#$%&'()*+,-.\n", "swapped-words", "'xxd -e'");
+  // Blanks in the text, which do not set the last group off.
+  expectRefused("00000000: 23222176 27262524 2b2a2028 2f2e2d2c  v!\"#$%&'( *+,-./\n", "swapped-words", "'xxd -e'");
+  expectRefused("00000000: 23202176 27262524                    v! #$%&'\n", "swapped-words", "'xxd -e'");
 }
 
 TEST(HexTextInput, RefusesOctalDecimalAndBits) {
   expectRefused("0000000 006740 000005 040041 000044\n0000007\n", "octal-text", "'od -Ax -v -tx1'");
   expectRefused(" 006740 000005 040041 000044\n", "octal-text", "octal");
+  expectRefused("0000000 00001206740 00011040041\n0000007\n", "octal-text", "octal");
   expectRefused("0000000 340 015 005 000 041 100 044\n0000007\n", "octal-text", "octal");
   expectRefused("0000000   03552   00005   16417   00036                                \n0000007\n", "decimal-text",
                 "'hexdump -C'");
@@ -268,13 +315,23 @@ TEST(HexTextInput, RefusesOctalDecimalAndBits) {
       "00000006: 00100100                                               $\n",
       "bit-text", "'xxd -b'");
   expectRefused("11100000 00001101 00000101\n", "bit-text", "bits");
+  expectRefused("00000000: 11100000 00001101 00000101\n", "bit-text", "bits");
   expectRefused("0000000  -32   13    5    0   33   64   36\n0000007\n", "bad-input", "\"-32\" in column 10", "1", 4);
   expectRefused("0000000 340  \\r 005  \\0   !   @   $\n0000007\n", "bad-input", "no hexadecimal byte", "1", 4);
 }
 
 TEST(HexTextInput, DoesNotTakeGroupsOfZerosForBits) {
+  expectOne("01000000 00000001\n", bytesOf("0100000000000001"));
   expectOne("00000000: 00000000 00000000 00000000 00000000  ................\n", std::string(16, '\0'));
   expectOne("e0000000 00000000 00000000\n", bytesOf("e00000000000000000000000"));
+}
+
+TEST(HexTextInput, DoesNotTakeLaterLinesForOctalWords) {
+  expectOne("e0 0d 05 00 21 40 24\n006740 000005\n", bytesOf("e00d0500214024006740000005"));
+}
+
+TEST(HexTextInput, KnowsDeleteInATextColumn) {
+  expectOne("00000000: e07f 0500 2140 24  ....!@$\n", bytesOf("e07f0500214024"));
 }
 
 TEST(HexTextInput, NamesLineAndColumnOfASlip) {
@@ -283,11 +340,14 @@ TEST(HexTextInput, NamesLineAndColumnOfASlip) {
   expectRefused("g0 0d 05 00 21 40 24", "bad-input", "\"g0\" in column 1", "1", 4);
   expectRefused("0xe0, 0x1ff, 0x05", "bad-input", "0x1ff", "1", 4);
   expectRefused("0xe0, 0x0d05, 0x05", "bad-input", "more than a byte", "1", 4);
+  expectRefused("0xe00d, 0x0500", "bad-input", "\"0xe00d\" in column 1 is more than a byte", "1", 4);
+  expectRefused("0000000 0abcd 01234\n", "bad-input", "\"0000000\" in column 1 has an odd number", "1", 4);
   expectRefused("e00d0", "bad-input", "odd number", "1", 4);
   expectRefused("0000007\ne00d\n", "bad-input", "odd number", "1", 4);
   expectRefused("[118, 119, 100]", "bad-input", "decimal", "1", 4);
   expectRefused("e0 0d \xff\x01", "bad-input", "\\xff\\x01", "1", 4);
   expectRefused("b'\\xe0\\x0d\\x05'", "bad-input", "\"b\" in column 1", "1", 4);
+  expectRefused("b\"\\xe0\\x0d\\x05\"", "bad-input", "\"b\" in column 1", "1", 4);
   expectRefused("/* e0 0d 05\n21 40\n", "bad-input", "does not end", "1", 4);
 }
 
@@ -335,6 +395,11 @@ TEST(HexTextInput, SeparatesReportsByLabels) {
               ElementsAre(kSummary, bytesOf("de01")));
 }
 
+TEST(HexTextInput, DataBehindALabelBeginAReport) {
+  EXPECT_THAT(readInput("e0 0d 05\nReport: e0 0c 05 00 21 40 24\n").bytes(),
+              ElementsAre(bytesOf("e00d05"), bytesOf("e00c0500214024")));
+}
+
 TEST(HexTextInput, AKnownIdAloneBeginsNoReport) {
   const std::string image = numbered(0x77, 2064);
   std::string text;
@@ -347,6 +412,8 @@ TEST(HexTextInput, ReadsOneReportALineWhereEachIsWhole) {
               ElementsAre(kSummary, bytesOf("e00c0500214024"), bytesOf("de01")));
   EXPECT_THAT(readInput("e00d0500214024\ne00c0500214024\nde01\nde00\n").bytes(),
               ElementsAre(kSummary, bytesOf("e00c0500214024"), bytesOf("de01"), bytesOf("de00")));
+  // What begins with no known ID belongs to the report before it, in a field of its own length too.
+  expectOne("e0 0d 05 00 21 40 24\n00 01\n", bytesOf("e00d0500214024 0001"));
 }
 
 TEST(HexTextInput, ReadsRunsOfAnalysersAndOfXxdAlike) {
@@ -365,11 +432,23 @@ TEST(HexTextInput, ReadsRunsOfAnalysersAndOfXxdAlike) {
 TEST(HexTextInput, RunsOfCutReportsStayApart) {
   EXPECT_THAT(readInput("e00d050021\ne00c050021\n").bytes(), ElementsAre(bytesOf("e00d050021"), bytesOf("e00c050021")));
   EXPECT_THAT(readInput("e00d05\ne00d0500214024\n").bytes(), ElementsAre(bytesOf("e00d05"), kSummary));
+  EXPECT_THAT(readInput("550102\n550304\n").bytes(), ElementsAre(bytesOf("550102"), bytesOf("550304")));
 }
 
 TEST(HexTextInput, ATextReportGoesOnUntilItsZero) {
   const std::string text = "\xd0" + std::string(70, 'A') + std::string(1, '\0');
   EXPECT_THAT(readInput(plainDump(text) + plainDump(text)).bytes(), ElementsAre(text, text));
+  EXPECT_THAT(readInput("d04100\n005500\n").bytes(), ElementsAre(bytesOf("d04100"), bytesOf("005500")));
+}
+
+TEST(HexTextInput, WhatGoesOnAfterFullLinesOfXxdIsToldByItsFirstByte) {
+  const std::string text = "\xd0" + std::string(28, 'A') + std::string(1, '\0');  // whole, in one full line
+  const std::string rest = std::string(30, '\x55'), again = numbered(0xE0, 30);
+  for (const std::string &first : {text, numbered(0xE0, 30), numbered(0x55, 30)}) {
+    SCOPED_TRACE(digitsOf(first));
+    EXPECT_THAT(readInput(plainDump(first) + plainDump(rest)).bytes(), ElementsAre(first + rest));
+    EXPECT_THAT(readInput(plainDump(first) + plainDump(again)).bytes(), ElementsAre(first, again));
+  }
 }
 
 TEST(HexTextInput, TypeFollowsFromTheIdUnlessTheUserSaysOtherwise) {
@@ -399,6 +478,9 @@ TEST(HexTextInput, BoundsAReport) {
 TEST(HexTextInput, TextWithoutDataIsNoHexText) {
   EXPECT_NE(detectedKind("To whom it may concern\n\nA bad idea, added.\n"), "hex");
   EXPECT_NE(detectedKind("<?xml version=\"1.0\"?>\n<a>\n</a>\n"), "hex");
+  EXPECT_NE(detectedKind("Five lines of words\nand one\nthat may\nas well\nhold data:\ne0 0d\n"), "hex");
+  EXPECT_EQ(detectedKind("e0 0d 05 00 2g 40 24\n"), "hex");  // a slip in what is data otherwise
+  EXPECT_NE(detectedKind("e0?\n"), "hex");
   EXPECT_THAT(readInput("# nothing\n", "hex").said(), ElementsAre("no-reports"));
 }
 

@@ -4,6 +4,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <iterator>
 #include <string>
 #include <type_traits>
 
@@ -17,6 +19,7 @@ std::vector<std::string> all(const DisplayLines &lines) {
 }
 
 static_assert(!std::is_copy_constructible_v<DisplayLines> && std::is_nothrow_move_constructible_v<DisplayLines>);
+static_assert(std::forward_iterator<DisplayLines::Iterator>);
 
 TEST(DisplayLines, EmptyListHasNoText) {
   const DisplayLines lines;
@@ -58,6 +61,27 @@ TEST(DisplayLines, GrowsFromAnyRoom) {
     }
     EXPECT_EQ(all(lines), wanted) << room;
   }
+}
+
+TEST(DisplayLines, RoomIsUsedToItsLastByteAndLine) {
+  // Memory that is let go while the new one is filled never has its address, so the address tells whether it grew.
+  const auto moves = [](std::size_t lineRoom, std::size_t bytes, auto append) {
+    DisplayLines lines(lineRoom, bytes);
+    const char *const before = lines.text().data();
+    append(lines);
+    EXPECT_EQ(lines.text(), "hello\n");
+    return lines.text().data() != before;
+  };
+  const auto check = [&](std::size_t bytes, auto append) {
+    EXPECT_FALSE(moves(1, bytes + 1, append));
+    EXPECT_TRUE(moves(1, bytes, append));
+    EXPECT_TRUE(moves(0, bytes + 1, append));
+  };
+  check(5, [](DisplayLines &lines) { lines.add("hello"); });
+  check(vesk::Format<"%s">::room("hello"), [](DisplayLines &lines) { lines.line<"%s">("hello"); });
+  check(5, [](DisplayLines &lines) {
+    lines.rows(1, 5, [](char *out, std::size_t) { return std::copy_n("hello", 5, out); });
+  });
 }
 
 TEST(DisplayLines, FormatsAndPlainTextInTurn) {
