@@ -1,6 +1,7 @@
 // Hands padded reports to the plug-in and judges what it was given.
 #include "host/decode/Decoder.h"
 
+#include <algorithm>
 #include <stdexcept>
 
 #include "host/report/KnownReports.h"
@@ -79,8 +80,8 @@ const Decoded &Decoder::decode(const SourceReport &report) {
     if (auto *lines = std::get_if<DisplayLines>(&result)) decoded_.lines = std::move(*lines);
   }
   const bool nothing = !decoded_.value && !decoded_.lines;
-  bool said = false;
-  for (const Finding &finding : decoded_.findings) said = said || finding.severity == Severity::kError;
+  const bool said = std::ranges::any_of(decoded_.findings,
+                                        [](const Finding &finding) { return finding.severity == Severity::kError; });
   if (nothing && !said) find(kNothingDecoded, "the decoder gave nothing: the text is not UTF-8");
   return decoded_;
 }

@@ -1,4 +1,4 @@
-// Keeps the last image, and draws it as often as an eye can follow.
+// Decodes what comes, and draws the last image as often as an eye can follow.
 #include "host/device/LiveView.h"
 
 #include <sys/ioctl.h>
@@ -44,13 +44,14 @@ LiveView::~LiveView() {
 
 void LiveView::report(const SourceReport &report, const LossCounter::Total &losses) {
   state_.lost = losses.lost;
-  if (report.type == ReportType::kInput && report.id == kSensorImage) {
-    lastImage_ = report.bytes;
+  const Decoded &decoded = decoder_.decode(report);
+  for (const Finding &finding : decoded.findings) failure(report.id, finding);
+  if (report.id == kSensorImage && decoded.value) {
     imageTimes_.push_back(*report.timeNs);
     while (imageTimes_.back() - imageTimes_.front() > kRateWindowNs) imageTimes_.pop_front();
-  } else if (report.type == ReportType::kInput && report.id == kAdcDumpPacket) {
-    ++state_.packets;
+    takeImage(*decoded.value);
   }
+  if (report.id == kAdcDumpPacket) ++state_.packets;
   draw();
 }
 
@@ -72,18 +73,6 @@ void LiveView::draw() {
   const auto now = std::chrono::steady_clock::now();
   if (now - drawn_ < kDrawEvery) return;
   drawn_ = now;
-  if (!lastImage_.empty()) {
-    SourceReport report;
-    report.bytes = lastImage_;
-    report.id = kSensorImage;
-    report.type = ReportType::kInput;
-    if (const Decoded &decoded = decoder_.decode(report); decoded.value) {
-      takeImage(*decoded.value);
-    } else {
-      for (const Finding &finding : decoded.findings) failure(kSensorImage, finding);
-    }
-    lastImage_.clear();
-  }
   if (winsize size{}; ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col != 0) {
     state_.columns = size.ws_col;
     state_.rows = size.ws_row;

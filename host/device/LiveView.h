@@ -41,7 +41,6 @@ class LiveView : public LiveConsumer {
   Messages messages_;
   OutputFile screen_{"-"};
   Decoder decoder_;
-  std::string lastImage_;
   std::deque<std::int64_t> imageTimes_;  // of the last seconds
   std::chrono::steady_clock::time_point drawn_;
   ViewState state_;

@@ -90,7 +90,11 @@ class UsbmonReader {
       request = stored->second;
       requests_.erase(stored);
     }
-    if (!event.in || (event.transfer != 'C' && event.transfer != 'I')) return;
+    if (!event.in) return;
+    if (event.transfer != 'C' && event.transfer != 'I') {
+      ++others_;
+      return;
+    }
 
     std::string_view rest = event.rest;
     std::string_view statusWord = takeWord(rest);

@@ -107,8 +107,9 @@ void addBits(std::vector<Field> &fields, Prober &prober, std::uint32_t offset) {
 }
 
 /// The fields in place of one row: neighbouring bytes that do the same are one number.
-void addModules(std::vector<Field> &fields, Prober &prober, const FieldRow &row) {
+void addModules(std::vector<Field> &fields, const KnownReport &report, const FieldRow &row) {
   constexpr std::string_view kSeveral;  // the pointer to the whole value
+  Prober prober(report);
   for (std::uint32_t at = row.offset; at < row.end();) {
     const Effect effect = prober.effectOf(at, 0xFF);
     if (effect.key == kSeveral) {
@@ -128,10 +129,9 @@ void addModules(std::vector<Field> &fields, Prober &prober, const FieldRow &row)
 
 std::vector<Field> layoutOf(const KnownReport &report) {
   std::vector<Field> fields;
-  std::optional<Prober> prober;
   for (const FieldRow &row : report.fields) {
     if (row.type == FieldType::kModules)
-      addModules(fields, prober ? *prober : prober.emplace(report), row);
+      addModules(fields, report, row);
     else
       fields.push_back({row.offset,
                         row.type,

@@ -62,6 +62,12 @@ class Choices(unittest.TestCase):
         self.assertEqual(len(ids(SESSION, "--device", "1234:5678")), 19)
         self.assertEqual(ids(SESSION, "--device", "1234:5679"), [])
 
+    def test_threads(self):
+        expected = run("decode", SESSION).stdout
+        for count in ("1", "2", "3"):
+            self.assertEqual(run("decode", "--jobs", count, SESSION).stdout, expected)
+        self.assertIn("--jobs", run("decode", "--jobs", "0", SESSION, code=2).stderr)
+
     def test_the_plug_ins_own_word(self):
         decimal = run("decode", "-decimal", "--hex", "DE 02").stdout
         self.assertEqual(decimal, run("decode", "--decimal", "--hex", "DE 02").stdout)

@@ -261,6 +261,7 @@ class Streams(Commands):
         out = self.ended(3, [GONE, counts(2)], "watch", "--report", "0x77", "-o", "hex")
         self.assertEqual({line.split()[2] for line in out.splitlines() if line.startswith("#")}, {"0x77"})
         self.bench.add()
+        self.refused("0x99: no report is called so", "watch", "--report", "0x99")
         out = self.ended(0, [counts(0, 2)], "watch", "--report", "0xE0", "--interval", "0.05", "--count", "2")
         self.assertEqual(out.count(SUMMARY), 2)
         self.assertEqual(self.ended(0, [counts(0, 1)], "watch", "--report", "0xE0", "--interval", "0.05", "--changes-only",
@@ -382,6 +383,18 @@ class Views(Commands):
         self.assertEqual(picture[1:3], ["2 ADC packets   0 lost", "waiting for a sensor image"])
         self.assertEqual(after, [f"{NODE}: error: 0xDF: the device refused the request: Broken pipe", counts(2)])
         self.assertEqual(self.bench.code, 4)
+
+    def test_feature_reports_beside_the_image(self):
+        self.bench.add(inputs=[image(5)])
+        picture, after = self.shown("--duration", "0.4", "--report", "0x76", "--report", "0xE0")
+        self.assertRegex(picture[1], r"^frame 5 ")
+        self.assertEqual(after, [counts(1, 1)])
+
+    def test_an_input_report_that_nobody_knows(self):
+        self.bench.add(inputs=[image(5), bytes([0x55, 1, 2])])
+        picture, after = self.shown("--duration", "0.4")
+        self.assertRegex(picture[1], r"^frame 5 ")
+        self.assertEqual(after, [f"{NODE}: error: 0x55: no report of the controller has this ID", counts(2)])
 
     def test_an_image_of_another_length(self):
         self.bench.add(inputs=[image(5) + b"more"])

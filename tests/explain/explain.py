@@ -39,6 +39,11 @@ class Explain(unittest.TestCase):
         for name in ("0xDF", "0xdf", "223", "watchdog"):
             self.assertEqual(explain(name), (0, WATCHDOG, ""))
 
+    def test_several_layouts(self):
+        status, out, err = explain("watchdog", "0xDE")
+        self.assertEqual((status, err), (0, ""))
+        self.assertTrue(out.startswith(WATCHDOG + "\n0xDE adc-dump-state: "), out)
+
     def test_every_report(self):
         listed = subprocess.run([PROGRAM, "reports"], capture_output=True, text=True, check=True).stdout.splitlines()[1:]
         self.assertEqual(len(listed), 17)

@@ -53,6 +53,8 @@ TEST(ReportDescriptor, tellsOurReportsUnderTheirTypes) {
 TEST(ReportDescriptor, itemsHaveZeroOneTwoOrFourBytes) {
   // 0x87 is a report ID with four bytes of data, 0x86 one with two; 0xB0 a feature without data.
   EXPECT_THAT(declared(std::string("\x87\xE0\0\0\0\xB1\x02\x86\xE1\0\xB0", 12)), ElementsAre(0xE0, 0xE1));
+  // A report ID without data is none, and the one before it holds.
+  EXPECT_THAT(declared("\x85\xE0\x84\xB1\x02"), ElementsAre(0xE0));
   // Data are no items, whatever they look like.
   EXPECT_THAT(declared(std::string("\x85\xE0\x27\x85\xE1\xB1\x02", 7)), IsEmpty());
 }
@@ -123,6 +125,10 @@ TEST(FindDevice, aNameOfNothingListsWhatThereIs) {
   EXPECT_EQ(message.kind->code, "no-device");
   EXPECT_EQ(message.kind->exitCode, 3);
   EXPECT_EQ(message.text, "no device is called S9; there are:\n  /dev/hidraw0  USB 046d:c077  Mouse");
+  DeviceIdentity nameless = mouse();
+  nameless.name.clear();
+  EXPECT_EQ(errorOf([&] { findDevice(std::vector{nameless}, "S9"); }).text,
+            "no device is called S9; there are:\n  /dev/hidraw0  USB 046d:c077");
   EXPECT_EQ(errorOf([] { findDevice({}, ""); }).text,
             "no device speaks the controller's reports; there is no HID device here");
 }
@@ -170,7 +176,7 @@ TEST(OpenDevice, namesModeOwnerAndRuleWhereRightsAreMissing) {
   std::ofstream(node).close();
   ASSERT_EQ(::chmod(node.c_str(), 0640), 0);
   FakeSystem system;
-  system.devices = {controller(canonicalNode(node))};
+  system.devices = {mouse(), controller(canonicalNode(node))};
   system.onOpen = [](const std::string &) { return HidSystem::Opened{nullptr, EACCES}; };
   const Stop stop;
   const auto begin = std::chrono::steady_clock::now();
@@ -181,6 +187,7 @@ TEST(OpenDevice, namesModeOwnerAndRuleWhereRightsAreMissing) {
   EXPECT_EQ(message.file, node);
   EXPECT_THAT(message.text, StartsWith("cannot be opened: Permission denied (mode 0640, owner "));
   EXPECT_THAT(message.text, HasSubstr("ATTRS{idVendor}==\"1234\", ATTRS{idProduct}==\"5678\", TAG+=\"uaccess\""));
+  EXPECT_THAT(message.text, Not(HasSubstr("046d"))) << "of this device alone";
   std::filesystem::remove(node);
 }
 

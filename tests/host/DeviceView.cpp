@@ -176,6 +176,15 @@ TEST(DeviceRecording, beginsWithTheDevice) {
                                 "I: 1c 00ab 5678\n"));
 }
 
+TEST(DeviceRecording, leavesOutWhatTheDeviceDoesNotHave) {
+  DeviceIdentity device = test::controller();
+  device.serial.clear();
+  device.physicalPath.clear();
+  const std::string header = recordingHeader(device, true, 1'700'000'000);
+  EXPECT_THAT(header, HasSubstr("\n# Bus USB, device 1234:5678\nR: "));
+  EXPECT_THAT(header, HasSubstr("\nN: Vesk Controller\nI: 3 1234 5678\n"));
+}
+
 TEST(DeviceRecording, doesNotTellWhoseDeviceItIsUnlessItMay) {
   const std::string header = recordingHeader(test::controller(), false, 1'700'000'000);
   EXPECT_THAT(header, HasSubstr(", 2023-11-14T22:13:20Z\n# Bus USB, device 1234:5678\nR: "));

@@ -73,6 +73,9 @@ TEST(Fields, whatTheValueLeavesOutIsReadFromItsBytes) {
   std::string bytes = "\xE1" + std::string(1022, '\0');
   test::put(bytes, 985, 0x0201, 2);
   EXPECT_THAT(fields({given(bytes)}), HasSubstr("   985  01 02                     PMGR # Events             513\n"));
+  // And where the report ends within them.
+  EXPECT_THAT(fields({given(bytes.substr(0, 986))}),
+              HasSubstr("   985  01 --                     PMGR # Events             1\n"));
 }
 
 TEST(Fields, textsHaveTheirWholeLength) {
@@ -83,6 +86,20 @@ TEST(Fields, textsHaveTheirWholeLength) {
             "     1  31 2e 32 2e 33 20 61 62 63 64 65 66 67 68 69 6a  text                      "
             "\"1.2.3 abcdefghijkl\"\n"
             "    17  6b 6c 00                  text\n");
+}
+
+TEST(Fields, whatDoesNotDecodeShowsItsBytesAlone) {
+  EXPECT_EQ(fields({given(fromHex("D0 FF FE 00"))}),
+            "== f: feature 0xD0 version, 4 bytes\n"
+            "     1  ff fe 00                  text\n");
+  EXPECT_EQ(fields({given(fromHex("D0"))}),
+            "== f: feature 0xD0 version, 1 byte\n"
+            "     1  --                        text                      \"\"\n");
+}
+
+TEST(Fields, bytesThatAreNobodysStandInOneRow) {
+  EXPECT_THAT(fields({given("\xE4" + std::string(400, '\x07'))}),
+              HasSubstr("   394  07 07 07 07 07 07 07      unused\n"));
 }
 
 TEST(Fields, unknownReportsShowTheirBytes) {

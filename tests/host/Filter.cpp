@@ -51,11 +51,15 @@ TEST(Filter, TakesADeviceByVendorAndProduct) {
 }
 
 TEST(Filter, ANameWithAColonThatIsNoPairOfNumbersIsAName) {
-  Filter filter;
-  filter.setDevice("usb:x");
-  SourceReport source = report(0xE0);
-  source.device = "usb:x";
-  EXPECT_TRUE(filter.wants(source));
+  for (const char *name : {"usb:x", "1234:x", "1234:ABCDx", "1234:1ABCD", "11234:ABCD", "1234:"}) {
+    Filter filter;
+    filter.setDevice(name);
+    SourceReport source = report(0xE0);
+    source.vendorProduct = 0x1234ABCD;
+    EXPECT_FALSE(filter.wants(source)) << name;
+    source.device = name;
+    EXPECT_TRUE(filter.wants(source)) << name;
+  }
 }
 
 TEST(Filter, ASpanOfTimeHoldsItsEndsAndNoReportWithoutATime) {
@@ -68,6 +72,9 @@ TEST(Filter, ASpanOfTimeHoldsItsEndsAndNoReportWithoutATime) {
     source.timeNs = time;
     EXPECT_EQ(filter.wants(source), wanted) << time;
   }
+  Filter to;
+  to.toNs = 20;
+  EXPECT_FALSE(to.wants(report(0xE0)));
 }
 
 }  // namespace

@@ -165,6 +165,9 @@ TEST(HidRecordingInput, OtherTextsAreNoRecordings) {
   EXPECT_NE(detectedKind("# comment\ne0 0d 05\n"), "hid-recording");
   EXPECT_NE(detectedKind("Re: your letter\n"), "hid-recording");
   EXPECT_NE(detectedKind("E0: 0d\n"), "hid-recording");
+  EXPECT_NE(detectedKind("X: 0d\n"), "hid-recording");
+  EXPECT_NE(detectedKind("# 0x05, 0x0d\n"), "hid-recording");
+  EXPECT_EQ(detectedKind("\n  \nE: 0.0 1 76\n"), "hid-recording");
 }
 
 TEST(HidRecordingInput, BoundsTheDevices) {
@@ -174,6 +177,8 @@ TEST(HidRecordingInput, BoundsTheDevices) {
   EXPECT_EQ(result.said().size(), 44u);
   EXPECT_EQ(result.said()[0], "too-many-devices 258");
   EXPECT_EQ(result.reports.at(0).device, "255");
+  // One of those that are kept apart may come again.
+  EXPECT_EQ(readInput(text + "D: 7\nE: 0.0 1 76\n").reports.at(0).device, "7");
 }
 
 TEST(HidRecordingInput, BoundsAReport) {

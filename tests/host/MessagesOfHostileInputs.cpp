@@ -32,6 +32,7 @@ TEST(MessagesOfHostileInputs, ControlsOfTwoBytesToo) {
                     "31m"),
             "f:3: error: \\x9B31m\n");
   EXPECT_EQ(printed("f", "\xC2\xA0"), "f:3: error: \xC2\xA0\n");
+  EXPECT_EQ(printed("f", "cut \xC2"), "f:3: error: cut \\xC2\n");
 }
 
 TEST(MessagesOfHostileInputs, TextStaysTextAndBytesBecomeDigits) {

@@ -105,6 +105,16 @@ TEST_F(PipelineTest, EveryNumberOfThreadsWritesTheSame) {
   }
 }
 
+TEST_F(PipelineTest, LargeReportsWaitForNoOthers) {
+  const auto feedLarge = [](Pipeline &pipeline) {
+    for (std::uint64_t i = 0; i < 20; ++i)
+      pipeline.report(report("\xD0" + std::string(60'000, static_cast<char>('a' + i)) + '\0', i));
+  };
+  const Outcome one = run("text", 1, {}, feedLarge), many = run("text", 2, {}, feedLarge);
+  EXPECT_EQ(one.output.size(), 20u * 60'003);  // an empty line before and behind each
+  EXPECT_EQ(many.output == one.output, true);
+}
+
 TEST_F(PipelineTest, TellsWhatIsShortUnknownAndLost) {
   const Outcome outcome = run("text", 2, {}, feedMany);
   EXPECT_EQ(outcome.exitCode, kExitFindings);

@@ -23,6 +23,11 @@ TEST(ProgressText, BelievesNoSizeThatWasPassed) {
   EXPECT_EQ(progressText("growing", 2000, 1000, 1, 1.0), "growing  2.0 kB  1 reports  1/s");
 }
 
+TEST(ProgressText, PromisesNothingBeforeTheFirstByte) {
+  EXPECT_EQ(progressText("f", 0, 1000, 0, 1.0), "f  0% of 1.0 kB  0 reports  0/s");
+  EXPECT_EQ(progressText("empty", 0, 0, 0, 1.0), "empty  0 B  0 reports  0/s");
+}
+
 TEST(ProgressText, WritesSizesInThreeDigits) {
   const auto size = [](std::uint64_t bytes) { return progressText("f", bytes, std::nullopt, 0, 0); };
   EXPECT_EQ(size(0), "f  0 B  0 reports");

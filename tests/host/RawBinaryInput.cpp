@@ -90,6 +90,7 @@ TEST(RawBinaryInput, StopsAtAnUnknownId) {
   EXPECT_EQ(result.messages[0].reportId, 0x55u);
   EXPECT_EQ(result.messages[0].exitCode, 4);
   EXPECT_THAT(result.messages[0].text, HasSubstr("3 bytes were not read"));
+  EXPECT_THAT(readSplit(numbered(0xE0, 7) + "\x55").messages.at(0).text, HasSubstr("; 1 byte was not read"));
 }
 
 TEST(RawBinaryInput, BoundsATextWithoutAnEnd) {

@@ -45,6 +45,9 @@ TEST(Raw, saysWhereABorderIsLost) {
   EXPECT_THAT(format("raw", {given(fromHex("D0 31 00 00 32"))}).codes, ElementsAre("raw-border"));
   EXPECT_THAT(format("raw", {given(fromHex("D0 31 00 00"))}).codes, IsEmpty());
   EXPECT_THAT(format("raw", {given(fromHex("99 31"))}).codes, ElementsAre("raw-border"));
+  Given other = given(fromHex("E0 0D 05 00 21 40 24"));  // what a device gave that was asked for another report
+  other.report.id = 0xE3;
+  EXPECT_THAT(format("raw", {other}).codes, ElementsAre("raw-border"));
 }
 
 // The lines behind the header of the first device.

@@ -34,6 +34,8 @@ TEST(UsbmonTextInput, TakesTheTypeFromTheRequest) {
   EXPECT_EQ(result.reports.at(0).device, "2.10");
   EXPECT_THAT(readInput("aa 5 S Ci:2:010:0 s a1 01 0476 0000 0318 4 <\naa 6 C Ci:2:010:0 0 4 = 76010203\n").said(),
               ElementsAre("bad-input 2"));
+  EXPECT_THAT(readInput("aa 5 S Ci:2:010:0 s a1 01 0076 0000 0318 4 <\naa 6 C Ci:2:010:0 0 4 = 76010203\n").said(),
+              ElementsAre("bad-input 2"));
 }
 
 TEST(UsbmonTextInput, ReadsTheFormWithoutABus) {
@@ -88,6 +90,9 @@ TEST(UsbmonTextInput, TellsWhatFailed) {
   const ReadResult result = readInput(kAsk + "ffff888100000001 1001500 C Ci:1:007:0 -32 0\n" + kAsk +
                                       "ffff888100000001 1001500 C Ci:1:007:0 0 0\n" + kAsk +
                                       "ffff888100000001 1001500 E Ci:1:007:0 -19 0\n" + kAsk);
+  // A submission that fails is no answer, whatever its status says.
+  EXPECT_THAT(readInput(kAsk + "ffff888100000001 1001500 E Ci:1:007:0 0 0\n").said(),
+              ElementsAre("failed-read 2", "no-reports"));
   EXPECT_THAT(result.said(),
               ElementsAre("failed-read 2", "empty-read 4", "failed-read 6", "unanswered-read 7", "no-reports"));
   EXPECT_THAT(result.messages[0].text, HasSubstr("-32"));
@@ -135,6 +140,36 @@ TEST(UsbmonTextInput, UnwrapsItsClock) {
   EXPECT_EQ(result.reports[1].timeNs, 998'000);
 }
 
+TEST(UsbmonTextInput, PassesOverEmptyLinesAndComments) {
+  const ReadResult result = readInput("\n# bus 1\n" + kAsk + " \t\n" + kAnswer);
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary));
+  EXPECT_THAT(result.messages, IsEmpty());
+}
+
+TEST(UsbmonTextInput, AnswersThatAreNoReportsAreMissedByNobody) {
+  const std::string descriptor = "aa 1 S Ci:1:007:0 s 80 06 0100 0000 0012 18 <\n";
+  EXPECT_THAT(readInput(descriptor + descriptor + kAsk + kAnswer).messages, IsEmpty());
+  EXPECT_THAT(readInput(kAsk + kAnswer + "aa 9 C Co:1:007:0 0 2 >\naa 9 C Ci:1:007:0 0 0\n").messages, IsEmpty());
+}
+
+TEST(UsbmonTextInput, DataWithoutARequestAreReportsOnlyWhereTheyCanBe) {
+  for (const std::string line : {"aa 1 C Bi:1:009:1 0 2 = de01", "aa 1 C Ci:1:007:0 0 2 = e00d",
+                                 "aa 1 C Ii:1:007:1 0:8 2 = de01", "aa 1 C Ii:1:007:1 0:8 2"}) {
+    const ReadResult result = readInput(kAsk + kAnswer + line + "\n");
+    EXPECT_THAT(result.bytes(), ElementsAre(kSummary)) << line;
+    ASSERT_THAT(result.said(), ElementsAre("usbmon-summary")) << line;
+    EXPECT_THAT(result.messages[0].text, testing::StartsWith("1 transfers hold no report")) << line;
+  }
+}
+
+TEST(UsbmonTextInput, TheUsersTypeIsNoGuess) {
+  vesk::host::ReadOptions options;
+  options.forcedType = ReportType::kInput;
+  const ReadResult result = readInput(kAnswer, {}, options);
+  EXPECT_EQ(result.reports.at(0).type, ReportType::kInput);
+  EXPECT_FALSE(result.reports.at(0).typeGuessed);
+}
+
 TEST(UsbmonTextInput, CountsOtherTraffic) {
   const ReadResult result = readInput(
       "aa 1 C Ii:1:009:1 0:8 4 = 00ff0000\nbb 2 S Co:1:007:0 s 21 09 03de 0000 0002 2 = de01\n" + kAsk + kAnswer);
@@ -149,6 +184,8 @@ TEST(UsbmonTextInput, NamesSlips) {
                                       "ffff888100000001 1001500 C Ci:1:007:0 0\nnothing like it\n" + kAsk + kAnswer);
   EXPECT_THAT(result.bytes(), ElementsAre(kSummary));
   EXPECT_THAT(result.said(), ElementsAre("bad-input 2", "bad-input 4", "bad-input 6", "unknown-line 7"));
+  EXPECT_THAT(readInput(kAsk + "ffff888100000001 1001500 C Ci:1:007:0 0 7 = e00d0500 21402g\n").said(),
+              ElementsAre("bad-input 2"));
 }
 
 TEST(UsbmonTextInput, BoundsTheRequestsThatWait) {
