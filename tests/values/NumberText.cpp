@@ -82,7 +82,7 @@ TEST(NumberText, AlignedDecimals) {
 TEST(NumberText, Hex8) {
   std::mt19937 random(2);
   const auto check = [](std::uint32_t v) {
-    ASSERT_EQ(written(vesk::kNumberRoom, [=](char *out) { return vesk::writeHex8(out, v); }), printed("%08x", v));
+    ASSERT_EQ(written(9, [=](char *out) { return vesk::writeHex8(out, v); }), printed("%08x", v));
   };
   for (std::uint32_t half = 0; half < 0x10000; ++half) check(half), check(half << 16), check(half << 8);
   for (int i = 0; i < 100000; ++i) check(static_cast<std::uint32_t>(random()));
@@ -124,6 +124,9 @@ TEST(NumberText, FixedAtTiesAndEdges) {
                              0.9995,
                              0.99949999,
                              999.9995,
+                             9999.9996,
+                             10000.0,
+                             10000.5,
                              0.9999995,
                              1e15,
                              1e16,

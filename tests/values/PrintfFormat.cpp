@@ -111,8 +111,63 @@ TEST(PrintfFormat, Texts) {
     EXPECT_LIKE_PRINTF("[%s I]", name);
     EXPECT_LIKE_PRINTF("[%s Q]", name);
     EXPECT_LIKE_PRINTF("%s %s", name, name);
+    EXPECT_LIKE_PRINTF("%19s|", name);
     EXPECT_EQ(vesk::formatted<"%40s|">(std::string_view(text)), test::printed("%40s|", name));
   }
+}
+
+/// What could be taken for a part of the conversion before it.
+TEST(PrintfFormat, LettersBehindAConversionAreText) {
+  EXPECT_LIKE_PRINTF("%il", 5);
+  EXPECT_LIKE_PRINTF("%slli", "5");
+  EXPECT_LIKE_PRINTF("%lluu", LongLong{5});
+  EXPECT_LIKE_PRINTF("%f.3f-0 ", 0.5);
+  EXPECT_LIKE_PRINTF("%08x8", 5u);
+}
+
+TEST(PrintfFormat, AConversionIsItsFlagsWidthPrecisionAndKind) {
+  const auto c = vesk::format::parseConversion("x% -19.3f%lld", 1);
+  EXPECT_EQ(c.begin, 1u);
+  EXPECT_EQ(c.end, 9u);
+  EXPECT_EQ(c.kind, 'f');
+  EXPECT_TRUE(c.left && c.blank && !c.zeros && !c.longLong);
+  EXPECT_EQ(c.width, 19u);
+  EXPECT_EQ(c.precision, 3u);
+  const auto d = vesk::format::parseConversion("x% -19.3f%lld", 9);
+  EXPECT_EQ(d.begin, 9u);
+  EXPECT_EQ(d.end, 13u);
+  EXPECT_EQ(d.kind, 'i');
+  EXPECT_TRUE(!d.left && !d.blank && !d.zeros && d.longLong);
+  EXPECT_EQ(d.width, 0u);
+  EXPECT_EQ(d.precision, 6u);
+}
+
+/// In a program these end the compilation.
+TEST(PrintfFormat, WhatIsNotInTheSubsetIsRefused) {
+  const auto refusal = [](const char *format) -> std::string {
+    try {
+      vesk::format::parseConversion(format, 0);
+    } catch (const char *why) {
+      return why;
+    }
+    return "none";
+  };
+  for (const char *format : {"%", "%c", "%p", "%n", "%5", "%q", "%e", "%li", "%%", "%+i", "%#x", "%*i"})
+    EXPECT_EQ(refusal(format), "a conversion that is not in the subset") << format;
+  for (const char *format : {"%05i", "%05u", "%05s", "%05.3f"})
+    EXPECT_EQ(refusal(format), "leading zeros are for hexadecimal numbers") << format;
+  for (const char *format : {"%5x", "%8X"})
+    EXPECT_EQ(refusal(format), "a width of hexadecimal digits wants leading zeros") << format;
+  for (const char *format : {"% i", "%-s", "%-5u", "% x", "%-X"})
+    EXPECT_EQ(refusal(format), "the blank flag and left alignment are for floats") << format;
+  for (const char *format : {"%llf", "%lls"}) EXPECT_EQ(refusal(format), "ll is for integers") << format;
+  for (const char *format : {"%.3i", "%.6x", "%.3s", "%.6u"})
+    EXPECT_EQ(refusal(format), "a precision is for floats") << format;
+  for (const char *format : {"%.2f", "%.5f", "%.7f", "%.0f", "%9.4f"})
+    EXPECT_EQ(refusal(format), "floats have 3 or 6 decimals") << format;
+  for (const char *format : {"%s", "%20s", "%i", "%14d", "%u", "%12u", "%x", "%08x", "%X", "%04X", "%f", "%.3f", "%.6f",
+                             "% -13.3f", "%lli", "%llu", "%llx", "%016llX"})
+    EXPECT_EQ(refusal(format), "none") << format;
 }
 
 TEST(PrintfFormat, LabelsPaddedByTheCompiler) {
