@@ -179,9 +179,9 @@ TEST(CaptureFormats, SimpleObsoleteAndUnknownBlocks) {
 
 TEST(CaptureFormats, JournalEntriesAreNumbered) {
   const Bytes submit = record(getReport(3, 0xE0, 7), 220, false), complete = record(answer(kSummary), 220, false);
-  const Outcome outcome = readBytes(sectionBlock(false) + interfaceBlock(220, false, false) +
-                                    packetBlock(0, 0, submit, false) + block(9, Bytes(8, 'x'), false) +
-                                    packetBlock(0, 0, complete, false));
+  const Outcome outcome =
+      readBytes(sectionBlock(false) + interfaceBlock(220, false, false) + packetBlock(0, 0, submit, false) +
+                block(9, Bytes(8, 'x'), false) + packetBlock(0, 0, complete, false));
   ASSERT_THAT(outcome.bytes(), ElementsAre(kSummary));
   EXPECT_EQ(outcome.reports[0].packet, 3u);
   EXPECT_THAT(outcome.codes(), IsEmpty());
@@ -264,6 +264,16 @@ TEST(CaptureFormats, LengthsThatLie) {
   EXPECT_EQ(tooLarge.messages[0].place.number, 3u);
 }
 
+TEST(CaptureFormats, ARecordThatLibpcapRefusesDoesNotHideTheNext) {
+  const Form pcap{220};
+  const Bytes before = capture({getReport(3, 0xE0, 7), answer(kSummary)}, pcap);
+  const Outcome outcome = readBytes(before + pcap.packet(Bytes(300'000, 'x'), kStartNs) + before.substr(24));
+  EXPECT_THAT(outcome.bytes(), ElementsAre(kSummary, kSummary));
+  ASSERT_THAT(outcome.codes(), ElementsAre("packet-damaged"));
+  EXPECT_EQ(outcome.messages[0].place.number, 3u);
+  EXPECT_THAT(outcome.messages[0].text, HasSubstr("300000"));
+}
+
 TEST(CaptureFormats, ACutRecordOfAnotherLinkTypeIsTold) {
   const Form form{1};
   const Bytes file = form.head() + form.packet(Bytes(60, 'x'), kStartNs) + form.packet(Bytes(60, 'x'), kStartNs);
@@ -295,9 +305,13 @@ TEST(CaptureFormats, OnePacketThatLiesDoesNotHideTheNext) {
   const Bytes head = sectionBlock(false) + interfaceBlock(220, false, false);
   Writer lying(false);  // announces more data than the block holds
   lying.u32(0).u32(0).u32(0).u32(100'000).u32(100'000).bytes(submit);
-  const Bytes bad[] = {block(6, lying.done(), false), packetBlock(5, 0, submit, false), block(6, Bytes(4, '\0'), false),
-                       block(6, {}, false), block(2, {}, false),
-                       packetBlock(0, 0, submit.substr(0, 40), false), packetBlock(0, 0, {}, false)};
+  const Bytes bad[] = {block(6, lying.done(), false),
+                       packetBlock(5, 0, submit, false),
+                       block(6, Bytes(4, '\0'), false),
+                       block(6, {}, false),
+                       block(2, {}, false),
+                       packetBlock(0, 0, submit.substr(0, 40), false),
+                       packetBlock(0, 0, {}, false)};
   for (const Bytes &block : bad) {
     const Outcome outcome =
         readBytes(head + block + packetBlock(0, 0, submit, false) + packetBlock(0, 0, complete, false));

@@ -2,6 +2,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <thread>
+
 #include "host/device/DeviceRecording.h"
 #include "host/device/LiveView.h"
 #include "host/device/View.h"
@@ -148,6 +150,10 @@ TEST(View, hasTheTerminalToItselfWhileItLives) {
     report.type = ReportType::kInput;
     report.timeNs = 0;
     view.report(report, {.lost = 2});
+    report.timeNs = 3'000'000'000;  // by then the first one says nothing about the rate any more
+    view.report(report, {.lost = 2});
+    std::this_thread::sleep_for(std::chrono::milliseconds(60));
+    view.idle();
     std::fflush(stderr);
   }
   const std::string screen = testing::internal::GetCapturedStdout();
@@ -155,6 +161,9 @@ TEST(View, hasTheTerminalToItselfWhileItLives) {
   EXPECT_TRUE(screen.ends_with("\x1b[?25h\x1b[?1049l"));
   EXPECT_THAT(screen, HasSubstr("frame 42   0.0/s   0.00 degC   2 lost"));
   EXPECT_THAT(screen, HasSubstr("P-SCAN I, +-5"));
+  EXPECT_EQ(screen.find("/s   0.00"), screen.find("0.0/s   0.00") + 3);
+  EXPECT_EQ(screen.rfind("/s   0.00"), screen.rfind("0.0/s   0.00") + 3);
+  EXPECT_NE(screen.find("frame 42"), screen.rfind("frame 42"));
   EXPECT_EQ(testing::internal::GetCapturedStderr(), "/dev/hidraw1: warning: 0x76: 2 lost\n");
 }
 

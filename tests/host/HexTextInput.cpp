@@ -266,6 +266,7 @@ TEST(HexTextInput, RefusesSqueezedLinesWithoutAnEnd) {
   expectRefused(" e1 00 00 00\n*\n 00 01\n", "bad-input", "od -An -v -tx1", "3", 4);
   expectRefused(" e1 00 00 00\n*\n 00 01\n*\n 02 03\n", "bad-input", "od -An -v -tx1", "3", 4);
   expectRefused("*\ne1 00\n", "bad-input", "none before it", "1", 4);
+  expectRefused("00000000:\n*\n00000010: e0\n", "bad-input", "whole number of lines", "3", 4);
   expectRefused("000000 e1 00 00 00\n*\n000007\n", "bad-input", "whole number of lines", "3", 4);
 }
 
@@ -337,6 +338,7 @@ TEST(HexTextInput, KnowsDeleteInATextColumn) {
 TEST(HexTextInput, NamesLineAndColumnOfASlip) {
   expectRefused("e0 0d\n05 0 021 40\n", "bad-input", "\"021\" in column 6 has an odd number of digits", "2", 4);
   expectRefused("e0 0d 05 00 2g 40 24", "bad-input", "\"2g\" in column 13", "1", 4);
+  expectRefused("e0 0d 05 00 " + std::string(30, 'g'), "bad-input", "\"" + std::string(24, 'g') + "...\"", "1", 4);
   expectRefused("g0 0d 05 00 21 40 24", "bad-input", "\"g0\" in column 1", "1", 4);
   expectRefused("0xe0, 0x1ff, 0x05", "bad-input", "0x1ff", "1", 4);
   expectRefused("0xe0, 0x0d05, 0x05", "bad-input", "more than a byte", "1", 4);
@@ -472,6 +474,12 @@ TEST(HexTextInput, BoundsAReport) {
   lines += "10\n";
   expectRefused(lines, "bad-input", "65536", "1", 4);
   expectRefused(digitsOf(std::string(65537, 'v')), "bad-input", "65536", "1", 4);
+  expectRefused(digitsOf(std::string(70000, 'v')), "bad-input", "65536", "1", 4);
+  std::string shortLines = "01 02\n", longer = "01 02 03\n";
+  for (int i = 0; i < 66000; ++i) shortLines += "03\n", longer += "04 05\n";
+  expectRefused(shortLines, "bad-input", "more than 65536 bytes", "65537", 4);
+  expectRefused(longer, "bad-input", "more than 65536 bytes", "65536", 4);
+  expectRefused("00000000: e000\n*\n0000fff0: e000\n*\n0001ffe0: 00\n", "bad-input", "65536", "5", 4);
   expectRefused(digitsOf(std::string(140000, 'v'), "%02x", ""), "bad-input", "65536", "1", 4);
 }
 

@@ -77,6 +77,12 @@ TEST(JsonRecord, aShortReportHasItsValueAndItsMessage) {
               testing::HasSubstr(R"("messages":[{"code":"short-report","severity":"error","text":"3 bytes long)"));
 }
 
+TEST(JsonRecord, severalMessagesStandInTheirOrder) {
+  const std::string text = format("jsonl", {given("\xD2one\ntwo")}).text;
+  EXPECT_THAT(text, testing::HasSubstr(R"("messages":[{"code":"unterminated-text","severity":"warning","text":")"));
+  EXPECT_THAT(text, testing::HasSubstr(R"("},{"code":"decoder-raised","severity":"error","text":")"));
+}
+
 TEST(JsonRecord, aGuessedTypeIsMarked) {
   Given report = given(fromHex("DE 00"));
   report.report.typeGuessed = true;

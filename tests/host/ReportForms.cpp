@@ -48,6 +48,8 @@ TEST(Raw, saysWhereABorderIsLost) {
   Given other = given(fromHex("E0 0D 05 00 21 40 24"));  // what a device gave that was asked for another report
   other.report.id = 0xE3;
   EXPECT_THAT(format("raw", {other}).codes, ElementsAre("raw-border"));
+  other.bytes.clear();
+  EXPECT_THAT(format("raw", {other}).codes, ElementsAre("raw-border"));
 }
 
 // The lines behind the header of the first device.

@@ -131,6 +131,28 @@ TEST(UsbmonTextInput, LearnsVendorAndProduct) {
   EXPECT_EQ(result.reports.at(0).timeNs, 1'001'499'000);
 }
 
+TEST(UsbmonTextInput, LearnsFromWholeDeviceDescriptorsAlone) {
+  for (const std::string exchange :
+       {"aa 1 S Ci:1:007:0 s 80 06 0200 0000 0012 18 <\n"
+        "aa 2 C Ci:1:007:0 0 18 = 12021002 00000040 34127856 00010102 0301\n",
+        "aa 1 S Ci:1:007:0 s 80 06 0100 0000 0008 8 <\naa 2 C Ci:1:007:0 0 8 = 12011002 00000040\n"})
+    EXPECT_EQ(readInput(exchange + kAsk + kAnswer).reports.at(0).vendorProduct, std::nullopt) << exchange;
+}
+
+TEST(UsbmonTextInput, LearnsOfNoMoreDevicesThanABusHas) {
+  std::string text;
+  for (int device = 100; device < 1200; ++device) {
+    const std::string address = "Ci:1:" + std::to_string(device) + ":0 ";
+    text += "aa 1 S " + address + "s 80 06 0100 0000 0012 18 <\n";
+    text += "aa 2 C " + address + "0 18 = 12011002 00000040 34127856 00010102 0301\n";
+    text += "aa 3 C " + address + "0 2 = de01\n";
+  }
+  const ReadResult result = readInput(text);
+  ASSERT_EQ(result.reports.size(), 1100u);
+  EXPECT_EQ(result.reports[1023].vendorProduct, 0x12345678u);
+  EXPECT_EQ(result.reports[1024].vendorProduct, std::nullopt);
+}
+
 TEST(UsbmonTextInput, UnwrapsItsClock) {
   const ReadResult result = readInput(
       "aa 4294967000 S Ci:1:007:0 s a1 01 03de 0000 0002 2 <\naa 704 C Ci:1:007:0 0 2 = de01\n"
