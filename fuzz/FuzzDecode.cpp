@@ -3,11 +3,13 @@
 #include <fcntl.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <nlohmann/json.hpp>
 
 #include "fuzz/FuzzInput.h"
 #include "fuzz/RecordedReports.h"
 #include "host/commands/ReadInputs.h"
+#include "host/output/FieldsFormatter.h"
 
 namespace {
 
@@ -53,7 +55,7 @@ struct Settings {
   bool decimal = false;
 };
 
-Run run(const Settings &settings, const char *form, unsigned jobs) {
+Run run(const Settings &settings, std::string_view form, unsigned jobs) {
   char *printed = nullptr;
   std::size_t printedSize = 0;
   std::FILE *stream = open_memstream(&printed, &printedSize);
@@ -64,7 +66,7 @@ Run run(const Settings &settings, const char *form, unsigned jobs) {
   Run result;
   {
     OutputFile output(pathOf("out"));
-    const auto formatter = findOutputKind(form)->make(settings.format);
+    const auto formatter = form == "fields" ? makeFieldsFormatter() : findOutputKind(form)->make(settings.format);
     Pipeline::Options pipelineOptions;
     pipelineOptions.decimal = settings.decimal;
     pipelineOptions.lenient = settings.format.lenient;
@@ -142,6 +144,53 @@ void checkConversions(const Settings &settings, const std::vector<std::string> &
   }
 }
 
+/// Every byte behind the ID stands in a row, beside its offset; what a report lacks is shown as such.
+void checkFields(const Settings &settings, const std::vector<std::string> &wanted) {
+  const Run fields = run(settings, "fields", 1);
+  constexpr std::size_t kHex = 8;  // the column behind the offset
+  std::size_t headings = 0;
+  std::vector<bool> shown;
+  const auto allShown = [&] { return std::find(shown.begin(), shown.end(), false) == shown.end(); };
+  std::size_t begin = 0;
+  for (std::size_t end; (end = fields.output.find('\n', begin)) != std::string::npos; begin = end + 1) {
+    const std::string row = fields.output.substr(begin, end - begin);
+    if (row.empty()) continue;
+    if (row.starts_with("== ")) {
+      check(allShown(), "all bytes of a report are shown before the next");
+      check(++headings <= wanted.size(), "a heading a report");
+      shown.assign(wanted[headings - 1].size(), false);
+      shown[0] = true;
+      continue;
+    }
+    const std::string &bytes = wanted.at(headings - 1);
+    std::size_t offset = std::stoul(row);
+    for (std::size_t at = kHex; at + 1 < row.size() && row[at] != ' '; at += 3, ++offset) {
+      const std::string digits = row.substr(at, 2);
+      check((digits == "--") == (offset >= bytes.size()), "only bytes that are not there are shown as missing");
+      if (offset >= bytes.size()) continue;
+      check(std::stoi(digits, nullptr, 16) == static_cast<unsigned char>(bytes[offset]), "a byte stands at its offset");
+      shown[offset] = true;
+    }
+  }
+  check(headings == wanted.size() && allShown(), "every report is shown, and all of the last one");
+}
+
+/// Rows have the header's columns, and raw output is the reports themselves.
+void checkRows(const Settings &settings, const std::vector<std::string> &wanted) {
+  const Run rows = run(settings, "csv", 1);
+  std::size_t commas = 0, begin = 0;
+  for (std::size_t end; (end = rows.output.find('\n', begin)) != std::string::npos; begin = end + 1) {
+    const auto count = std::count(rows.output.begin() + static_cast<std::ptrdiff_t>(begin),
+                                  rows.output.begin() + static_cast<std::ptrdiff_t>(end), ',');
+    if (begin == 0) commas = static_cast<std::size_t>(count);
+    check(commas != 0 && commas == static_cast<std::size_t>(count), "all rows have the header's columns");
+  }
+  check(begin == rows.output.size(), "every row ends");
+  std::string all;
+  for (const std::string &bytes : wanted) all += bytes;
+  checkSame(run(settings, "raw", 1).output, all, "raw output is the reports");
+}
+
 /// The reports that a run hands to its output, by the shortest way.
 std::vector<std::string> reportsOf(const json &document) {
   std::vector<std::string> all;
@@ -183,7 +232,10 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     checkSame(shared.output, text.output, "several threads write the same");
     checkSame(shared.messages, text.messages, "several threads say the same");
   }
-  checkConversions(settings, reportsOf(json::parse(whole.output)));
+  const std::vector<std::string> reports = reportsOf(json::parse(whole.output));
+  checkConversions(settings, reports);
+  if ((flags & 0x30) == 0x10) checkFields(settings, reports);
+  if ((flags & 0x30) == 0x20) checkRows(settings, reports);
   ::unlink(settings.input.files[0].c_str());
   return 0;
 }
