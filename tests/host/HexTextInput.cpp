@@ -318,7 +318,7 @@ TEST(HexTextInput, RefusesOctalDecimalAndBits) {
   expectRefused("11100000 00001101 00000101\n", "bit-text", "bits");
   expectRefused("00000000: 11100000 00001101 00000101\n", "bit-text", "bits");
   expectRefused("0000000  -32   13    5    0   33   64   36\n0000007\n", "bad-input", "\"-32\" in column 10", "1", 4);
-  expectRefused("0000000 340  \\r 005  \\0   !   @   $\n0000007\n", "bad-input", "no hexadecimal byte", "1", 4);
+  expectRefused("0000000 340  \\r 005  \\0   !   @   $\n0000007\n", "bad-input", "'od -Ax -v -tx1' print them", "1", 4);
 }
 
 TEST(HexTextInput, DoesNotTakeGroupsOfZerosForBits) {

@@ -193,6 +193,24 @@ TEST(Dictionary, NestedDictionariesFillTheOuterRoomAndThenTheirOwn) {
   EXPECT_EQ(v.at("R").at("A").size(), 3u);
 }
 
+TEST(Dictionary, NestedEntriesLieBehindTheirDictionarysOwn_AsFarAsThereIsRoom) {
+  const auto entriesOf = [](const Dictionary &dictionary, std::string_view key) {
+    return dictionary.find(key)->as<Dictionary>().begin();
+  };
+  Dictionary outer(3, 2);
+  outer.addDictionary("P", 2);
+  outer.addDictionary("Q", 1);
+  EXPECT_EQ(entriesOf(outer, "P"), outer.begin() + 3);
+  EXPECT_NE(entriesOf(outer, "Q"), outer.begin() + 3);
+  EXPECT_NE(entriesOf(outer, "Q"), outer.begin() + 5);
+  Dictionary without(1);
+  without.addDictionary("P", 1);
+  EXPECT_NE(entriesOf(without, "P"), without.begin() + 1);
+  // What was dealt out deals nothing out.
+  Dictionary whole(1, 2);
+  whole.addDictionary("P", 1).addDictionary("D", 1);
+  EXPECT_NE(entriesOf(whole.find("P")->as<Dictionary>(), "D"), whole.begin() + 2);
+}
 TEST(Dictionary, NestedDictionaryIsFullToo) {
   Dictionary outer(2, 4);
   EntryAdder inner = outer.addDictionary("P", 1);

@@ -58,9 +58,12 @@ TEST(Text, MovesLeaveAnEmptyConstant) {
   EXPECT_TRUE(first.isConstant());  // NOLINT
   first = std::move(second);
   EXPECT_EQ(first.view(), "moved");
+  EXPECT_FALSE(first.isConstant());
   second = Text(kWord);
+  EXPECT_TRUE(second.isConstant());
   first = second;
   EXPECT_EQ(first.view(), "WARNING");
+  EXPECT_TRUE(first.isConstant());
   static_assert(std::is_nothrow_move_constructible_v<Text>);
 }
 
