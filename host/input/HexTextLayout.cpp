@@ -64,8 +64,7 @@ std::optional<LayoutRefusal> refuseLayout(const HexTextLine &line, bool isFirst)
   if (offset && digits == 5 && allConsistOf("0123456789"))
     return refuse(kDecimalText, "the bytes are written as decimal words, as from 'hexdump -d'");
   if ((digits == 4 || digits == 8 || digits == 16) && !fields[first].prefixed) {
-    const bool swappedId =
-        isFirst && several && !beginsReport(front) && beginsReport(front.substr(front.size() - 2));
+    const bool swappedId = isFirst && several && !beginsReport(front) && beginsReport(front.substr(front.size() - 2));
     if (offset || swappedId)
       return refuse(kSwappedWords,
                     "the bytes stand in words, swapped as on most machines, as from 'hexdump' without -C or 'od -tx2'");
@@ -83,8 +82,7 @@ std::optional<LayoutRefusal> refuseSwappedText(const HexTextLine &line, std::str
                                                 blank % 2 == 0 && consistsOf(text.substr(0, blank), "0123456789abcdef"))
     text.remove_prefix(std::min(text.find_first_not_of(' ', blank), text.size()));
   const std::size_t whole = bytes.size() / group * group;
-  if (!shows(text, whole, [&](std::size_t i) { return bytes[i / group * group + group - 1 - i % group]; }))
-    return {};
+  if (!shows(text, whole, [&](std::size_t i) { return bytes[i / group * group + group - 1 - i % group]; })) return {};
   return refuse(kSwappedWords, "the text column shows that the bytes of each group are swapped, as from 'xxd -e'");
 }
 

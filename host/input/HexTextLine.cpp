@@ -173,9 +173,9 @@ void HexTextLine::judgeWords(std::string_view line) {
   const std::size_t all = words_ + fields_.size(), likeHex = likeHex_;
   // A line with an offset is never a label.
   const bool offset = !fields_.empty() && fields_[0].column == 1 && fields_[0].digits.size() >= 6;
-  const std::string problem = quoted(firstWord_) + " in column " + std::to_string(firstWordAt_) +
-                              " is no hexadecimal byte" +
-                              (offset ? ", as 'xxd', 'hexdump -C' and 'od -Ax -v -tx1' print them behind an offset" : "");
+  const std::string problem =
+      quoted(firstWord_) + " in column " + std::to_string(firstWordAt_) + " is no hexadecimal byte" +
+      (offset ? ", as 'xxd', 'hexdump -C' and 'od -Ax -v -tx1' print them behind an offset" : "");
   if (dataBehindLabel(line)) {
     kind_ = Kind::kData;
     hasLabel_ = true;
