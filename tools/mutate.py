@@ -141,17 +141,22 @@ class Bench:
         return sorted(self.tests, key=lambda test: (-noticed[str(test)], test.stem != path.stem,
                                                     test.parent.name != path.parent.name))
 
-    def judge(self, mutant):
-        """"killed" and by which test, "compiler" for what does not compile, or "survived"."""
+    def judge(self, mutant, listed):
+        """"killed" and by which test, "compiler" for what does not compile, or "survived". `listed`: as equivalent."""
         folder, path = self.folder(), pathlib.Path(mutant.path)
         (folder / path).parent.mkdir(parents=True)
         (folder / path).write_text(mutant.text)
-        beside = [test for test in self.likely_first(path) if self.reads(test, path) and test.parent == "tests" / path.parent]
+        near = [test for test in self.likely_first(path) if test.parent == "tests" / path.parent]
+        beside = [test for test in near if self.includes(test, path)]
         # The tests beside a header instantiate what it declares; most changes end here, without building the core anew.
-        return self.judge_by(beside, path, folder) or self.judge_in_core(path, folder) or ("survived", "")
+        verdict = self.judge_by(beside, path, folder) or self.judge_in_core(path, folder)
+        if verdict is None and not listed:  # what is inline may be in tests alone that read the header by way of others
+            others = [test for test in near if test not in beside and str(ROOT / path) in self.depends[test]]
+            verdict = self.judge_by(others, path, folder)
+        return verdict or ("survived", "")
 
     @staticmethod
-    def reads(test, header):
+    def includes(test, header):
         return f'#include "{header}"' in (ROOT / test).read_text()
 
     def compile_changed(self, path, folder, file):
@@ -221,7 +226,8 @@ def main():
     fresh.sort(key=lambda mutant: is_equivalent(mutant.key))  # last, because all tests run for them
     counts = collections.Counter("equivalent" if verdict == "survived" else verdict for verdict in known.values())
     with concurrent.futures.ThreadPoolExecutor(options.jobs) as pool, RESULTS.open("a") as log:
-        for mutant, (verdict, test) in zip(fresh, pool.map(bench.judge, fresh)):
+        listed = [is_equivalent(mutant.key) for mutant in fresh]
+        for mutant, (verdict, test) in zip(fresh, pool.map(bench.judge, fresh, listed)):
             log.write(json.dumps({"mutant": mutant.id, "verdict": verdict, "by": test}) + "\n")
             log.flush()
             if verdict == "survived" and is_equivalent(mutant.key):

@@ -16,6 +16,10 @@ using test::Report;
 using testing::ElementsAre;
 using testing::Pair;
 
+static_assert(!std::is_copy_constructible_v<HIDReportVeskPlugin> && !std::is_copy_assignable_v<HIDReportVeskPlugin>);
+static_assert(HIDReportVeskPlugin::kInputReport == 0 && HIDReportVeskPlugin::kOutputReport == 1 &&
+              HIDReportVeskPlugin::kFeatureReport == 2);
+
 struct Row {
   std::uint32_t id;
   const char *decoder;

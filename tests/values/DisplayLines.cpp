@@ -123,8 +123,9 @@ TEST(DisplayLines, MoveLeavesAnEmptyListThatCanBeUsed) {
   EXPECT_TRUE(first.empty());  // NOLINT: the promise under test
   EXPECT_EQ(first.text(), "");
   first.add("b");
+  first.add("c");
   second = std::move(first);
-  EXPECT_THAT(all(second), ElementsAre("b"));
+  EXPECT_THAT(all(second), ElementsAre("b", "c"));
   EXPECT_TRUE(first.empty());  // NOLINT
 }
 

@@ -85,6 +85,7 @@ TEST(ReportValue, FloatsCompareByTheirBits) {
   EXPECT_FALSE(value(0.0) == value(-0.0));
   EXPECT_TRUE(value(std::vector{nan, 1.0f}) == value(std::vector{nan, 1.0f}));
   EXPECT_FALSE(value(std::vector{0.0f}) == value(std::vector{-0.0f}));
+  EXPECT_FALSE(value(std::vector{1.0f, 2.0f, 3.0f}) == value(std::vector{1.0f, 2.0f, 4.0f}));
   EXPECT_FALSE(value(std::vector{1.0f}) == value(std::vector{1.0f, 1.0f}));
 }
 
@@ -197,7 +198,8 @@ TEST(Dictionary, NestedEntriesLieBehindTheirDictionarysOwn_AsFarAsThereIsRoom) {
   const auto entriesOf = [](const Dictionary &dictionary, std::string_view key) {
     return dictionary.find(key)->as<Dictionary>().begin();
   };
-  Dictionary outer(3, 2);
+  Dictionary first(3, 2);
+  Dictionary outer(std::move(first));
   outer.addDictionary("P", 2);
   outer.addDictionary("Q", 1);
   EXPECT_EQ(entriesOf(outer, "P"), outer.begin() + 3);
@@ -234,6 +236,8 @@ TEST(Dictionary, NestedDictionariesMoveWithTheirTree) {
   ReportValue taken(u8(0));
   taken = ReportValue(std::move(outer));
   EXPECT_EQ(outer.size(), 0u);
+  EXPECT_THROW(outer.add("A", u8(1)), std::length_error);
+  EXPECT_THROW(outer.addDictionary("A", 1), std::length_error);
   EXPECT_THAT(keys(taken.at("P").as<Dictionary>()), ElementsAre("A", "B", "C"));
   EXPECT_EQ(taken.at("P").at("A").as<std::uint32_t>(), 7u);
   EXPECT_EQ(taken.at("P").at("B").as<vesk::Text>(), std::string(100, 'b'));
