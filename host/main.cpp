@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <exception>
+#include <new>
 #include <sstream>
 
 #include "host/commands/Command.h"
@@ -41,6 +42,14 @@ void occupyStandardDescriptors() {
     if (::fcntl(fd, F_GETFD) == -1) ::open("/dev/null", fd == STDIN_FILENO ? O_WRONLY : O_RDONLY);
 }
 
+/// Memory that runs out while the command line is put together does so in functions of its library that must not throw,
+/// which would end in abort(). Nothing has been opened yet.
+[[noreturn]] void endWithoutMemory() {
+  constexpr std::string_view kText = "vesk-report: error: out of memory\n";
+  [[maybe_unused]] const auto written = ::write(STDERR_FILENO, kText.data(), kText.size());
+  ::_exit(kExitUnreadable);
+}
+
 /// Prints what was asked for (help, the version) or what is wrong with the command line.
 ExitCode answer(const CLI::App &app, const CLI::ParseError &error) {
   std::ostringstream out, problem;
@@ -60,6 +69,7 @@ int runProgram(int argc, char **argv) {
   app.footer(kExitCodes);
   app.require_subcommand(1);
   app.fallthrough();
+  app.parse_complete_callback([] { std::set_new_handler(nullptr); });  // a command's run raises std::bad_alloc
   app.add_flag("-q,--quiet", context.messages.quiet, "errors only");
   app.add_flag("-v,--verbose", context.messages.verbose,
                "notes too, and every message rather than the first of its kind");
@@ -91,6 +101,7 @@ int main(int argc, char **argv) {
   // Both would kill; without them the call fails and says why.
   std::signal(SIGPIPE, SIG_IGN);
   std::signal(SIGXFSZ, SIG_IGN);
+  std::set_new_handler(endWithoutMemory);
   try {
     return runProgram(argc, argv);
   } catch (const PipeClosed &) {
@@ -98,6 +109,9 @@ int main(int argc, char **argv) {
   } catch (const OutputError &error) {
     std::fprintf(stderr, "vesk-report: error: %s\n", error.what());
     return kExitOutput;
+  } catch (const std::bad_alloc &) {
+    std::fputs("vesk-report: error: out of memory\n", stderr);
+    return kExitUnreadable;
   } catch (const std::exception &error) {
     std::fprintf(stderr, "vesk-report: error: %s\n", error.what());
     return kExitUnreadable;

@@ -1,11 +1,12 @@
-// Preloaded into the program under test: once it makes its output file, the n-th allocation fails.
+// Preloaded into the program under test: from its first call of signal() on, which is the first thing that it does, the
+// n-th allocation fails.
 //
 // VESK_NO_MEMORY says which, counted from 1; 0 lets all succeed, and tells their number on standard error at the end.
-// What comes before is the command line, whose library allocates in functions that must not throw.
 #include <dlfcn.h>
 
 #include <atomic>
 #include <cerrno>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 
@@ -34,15 +35,12 @@ void *malloc(std::size_t size) noexcept {
   return __libc_malloc(size);
 }
 
-int mkostemp(char *name, int flags) {
-  const int fd = reinterpret_cast<int (*)(char *, int)>(dlsym(RTLD_NEXT, "mkostemp"))(name, flags);
+sighandler_t signal(int number, sighandler_t handler) noexcept {
+  const auto before =
+      reinterpret_cast<sighandler_t (*)(int, sighandler_t)>(dlsym(RTLD_NEXT, "signal"))(number, handler);
   if (const char *text = std::getenv("VESK_NO_MEMORY")) failing = std::atol(text);
   begun = true;
-  return fd;
-}
-
-int mkostemp64(char *name, int flags) {
-  return mkostemp(name, flags);
+  return before;
 }
 
 }  // extern "C"

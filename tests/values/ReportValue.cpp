@@ -211,7 +211,8 @@ TEST(Dictionary, NestedEntriesLieBehindTheirDictionarysOwn_AsFarAsThereIsRoom) {
   // What was dealt out deals nothing out.
   Dictionary whole(1, 2);
   whole.addDictionary("P", 1).addDictionary("D", 1);
-  EXPECT_NE(entriesOf(whole.find("P")->as<Dictionary>(), "D"), whole.begin() + 2);
+  const auto &nested = whole.find("P")->as<Dictionary>();
+  EXPECT_NE(entriesOf(nested, "D"), nested.begin() + 1);
 }
 TEST(Dictionary, NestedDictionaryIsFullToo) {
   Dictionary outer(2, 4);
