@@ -171,6 +171,9 @@ void HexTextLine::takeField(std::string_view line, std::size_t begin, std::size_
 /// A line with words: a label where most of it is words, with or without data behind it; else a slip.
 void HexTextLine::judgeWords(std::string_view line) {
   const std::size_t all = words_ + fields_.size(), likeHex = likeHex_;
+  // Of one word and one number "length: 64" is a label; "0g 64" is a slip.
+  const bool keyed = (line.find(": ") != std::string_view::npos || line.find("= ") != std::string_view::npos) &&
+                     !fields_.empty() && firstWordAt_ < fields_[0].column;
   // A line with an offset is never a label.
   const bool offset = !fields_.empty() && fields_[0].column == 1 && fields_[0].digits.size() >= 6;
   const std::string problem =
@@ -180,7 +183,7 @@ void HexTextLine::judgeWords(std::string_view line) {
     kind_ = Kind::kData;
     hasLabel_ = true;
     isRun_ = false;
-  } else if (2 * likeHex < all && !offset) {
+  } else if (2 * likeHex < all + (keyed ? 1 : 0) && !offset) {
     kind_ = Kind::kLabel;
   } else {
     fail(problem);

@@ -152,7 +152,8 @@ Closing device
 }
 
 TEST(HexTextInput, ANumberBehindWordsNeedNotBeAReport) {
-  for (const char *label : {"Length of report: 76", "Its ID is: 0xde", "Feature report e0: 64 bytes long"})
+  for (const char *label : {"length: 64", "size = 7", "Length: 76", "Length of report: 76", "Its ID is: 0xde",
+                            "Feature report e0: 64 bytes long"})
     expectOne(std::string(label) + "\ne0 0d 05 00 21 40 24\n", kSummary);
 }
 
@@ -340,6 +341,9 @@ TEST(HexTextInput, NamesLineAndColumnOfASlip) {
   expectRefused("e0 0d 05 00 2g 40 24", "bad-input", "\"2g\" in column 13", "1", 4);
   expectRefused("e0 0d 05 00 " + std::string(30, 'g'), "bad-input", "\"" + std::string(24, 'g') + "...\"", "1", 4);
   expectRefused("g0 0d 05 00 21 40 24", "bad-input", "\"g0\" in column 1", "1", 4);
+  expectRefused("g0 0d", "bad-input", "\"g0\" in column 1", "1", 4);
+  expectRefused("g0:0d", "bad-input", "\"g0\" in column 1", "1", 4);
+  expectRefused("e0: 0g", "bad-input", "\"0g\" in column 5", "1", 4);
   expectRefused("0xe0, 0x1ff, 0x05", "bad-input", "0x1ff", "1", 4);
   expectRefused("0xe0, 0x0d05, 0x05", "bad-input", "more than a byte", "1", 4);
   expectRefused("0xe00d, 0x0500", "bad-input", "\"0xe00d\" in column 1 is more than a byte", "1", 4);
