@@ -68,6 +68,9 @@ namespace {
 struct Case {
   unsigned id;
   std::size_t size;
+  friend std::ostream &operator<<(std::ostream &out, const Case &c) {
+    return out << c.id << " of " << c.size << " bytes";
+  }
 };
 
 constexpr Case kCases[] = {{0xD0, 40},   {0xD2, 90},  {0xDC, 25}, {0xDE, 2},   {0xE0, 7},   {0xE1, 1023},
