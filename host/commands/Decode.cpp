@@ -27,9 +27,12 @@ void run(Options &options, CommandContext &context) {
   Messages messages(messageOptions);
   const auto formatter = options.output.makeFormatter();
   Pipeline pipeline(options.output.pipeline(), options.input.filter, *formatter, output, messages);
-  pipeline.begin();
-  readInputs(options.input, pipeline);
-  pipeline.finish();
+  try {
+    pipeline.begin();
+    readInputs(options.input, pipeline);
+    pipeline.finish();
+  } catch (const PipeClosed &) {  // what was found before it left counts
+  }
   context.exitCode = messages.exitCode();
 }
 

@@ -13,10 +13,21 @@ void DeviceOptions::addDevice(CLI::App &command) {
       ->group("Device");
 }
 
+CLI::Validator secondsBetween(double least, double most) {
+  const auto range = CLI::Range(least, most);
+  return {[range](std::string &text) {
+            double seconds = 0;
+            if (CLI::detail::lexical_cast(text, seconds) && std::isnan(seconds))
+              return text + " is no number of seconds";
+            return range(text);
+          },
+          range.get_description()};
+}
+
 void DeviceOptions::addTimeout(CLI::App &command) {
   command
       .add_option("--timeout", timeoutSeconds, "how long a report may take to come; the kernel gives up after 5 itself")
-      ->check(CLI::Range(0.05, 60.0))
+      ->check(secondsBetween(0.05, 60.0))
       ->type_name("SECONDS")
       ->capture_default_str()
       ->group("Device");

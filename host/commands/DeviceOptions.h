@@ -9,6 +9,9 @@
 
 namespace vesk::host {
 
+/// CLI::Range without NaN, which lies in every range there.
+CLI::Validator secondsBetween(double least, double most);
+
 struct DeviceOptions {
   std::string device;  // empty: the one that speaks our reports
   double timeoutSeconds = 5;

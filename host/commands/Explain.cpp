@@ -117,9 +117,12 @@ void explainReports(const Options &options, CommandContext &context) {
   OutputFile output("-");
   const auto formatter = makeFieldsFormatter();
   Pipeline pipeline({}, options.input.filter, *formatter, output, messages);
-  pipeline.begin();
-  readInputs(options.input, pipeline);
-  pipeline.finish();
+  try {
+    pipeline.begin();
+    readInputs(options.input, pipeline);
+    pipeline.finish();
+  } catch (const PipeClosed &) {  // what was found before it left counts
+  }
   context.exitCode = messages.exitCode();
 }
 

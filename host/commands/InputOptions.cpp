@@ -1,22 +1,26 @@
 // Input options.
 #include "host/commands/InputOptions.h"
 
-#include <cmath>
+#include "host/input/PlainText.h"
 
 namespace vesk::host {
 
 namespace {
 
-constexpr double kMostSeconds = 9e9;  // 285 years: what 64 bits of nanoseconds hold
-
-std::int64_t nanoseconds(double seconds) {
-  return static_cast<std::int64_t>(std::llround(seconds * 1e9));
+/// Exact, as inputs tell it: a double would miss a report whose time is given since 1970.
+std::int64_t nanoseconds(const std::string &option, const std::string &text) {
+  const bool negative = text.starts_with('-');
+  const auto time = parseSeconds(std::string_view(text).substr(negative ? 1 : 0));
+  if (!time) throw CLI::ValidationError(option, "a time in seconds was expected, as 12 or 0.004120, not " + text);
+  return negative ? -*time : *time;
 }
 
 }  // namespace
 
 void InputOptions::addTo(CLI::App &command) {
-  command.add_option("files", files, "inputs of any kind; - or none is standard input")->type_name("FILE");
+  command.add_option("files", files, "inputs of any kind; - or none is standard input")
+      ->type_name("FILE")
+      ->allow_extra_args(false);  // which would take a name in brackets for a list
   command.add_option("--hex", hexReports, "a report as hex digits on the command line")
       ->type_name("TEXT")
       ->allow_extra_args(false);
@@ -65,16 +69,14 @@ void InputOptions::addTo(CLI::App &command) {
       ->type_name("DEVICE")
       ->group("Filters");
   command
-      .add_option_function<double>(
-          "--from", [this](double seconds) { filter.fromNs = nanoseconds(seconds); },
-          "take reports from this time on, in seconds from the start of the input")
-      ->check(CLI::Range(-kMostSeconds, kMostSeconds))
+      .add_option_function<std::string>(
+          "--from", [this](const std::string &text) { filter.fromNs = nanoseconds("--from", text); },
+          "take reports from this time on, in seconds from the start of the input; none that has no time")
       ->type_name("SECONDS")
       ->group("Filters");
   command
-      .add_option_function<double>(
-          "--to", [this](double seconds) { filter.toNs = nanoseconds(seconds); }, "and up to this time")
-      ->check(CLI::Range(-kMostSeconds, kMostSeconds))
+      .add_option_function<std::string>(
+          "--to", [this](const std::string &text) { filter.toNs = nanoseconds("--to", text); }, "and up to this time")
       ->type_name("SECONDS")
       ->group("Filters");
 }

@@ -11,6 +11,7 @@ namespace {
 void readInput(ByteSource &source, const InputOptions &options, Pipeline &pipeline) {
   const std::string_view head = source.peek(kHeadSize).substr(0, kHeadSize);
   if (head.empty()) {
+    source.checkEnd();
     pipeline.message({&kNoReports, source.name(), {}, {}, "the input is empty"});
     return;
   }
@@ -19,6 +20,7 @@ void readInput(ByteSource &source, const InputOptions &options, Pipeline &pipeli
   ReadOptions readOptions = options.read;
   readOptions.kindForced = options.kind != "auto";
   kind.read(source, readOptions, pipeline);
+  source.checkEnd();
 }
 
 void readFile(const std::string &path, const InputOptions &options, Pipeline &pipeline) {

@@ -131,7 +131,7 @@ void addCommon(CLI::App &command, Options &options) {
       ->check(CLI::PositiveNumber)
       ->type_name("N");
   command.add_option("--duration", options.duration, "end after so many seconds")
-      ->check(CLI::Range(0.001, 1e6))
+      ->check(secondsBetween(0.001, 1e6))
       ->type_name("SECONDS");
   options.device.addDevice(command);
   options.device.addTimeout(command);
@@ -153,7 +153,7 @@ void addWatch(CLI::App &app, CommandContext &context) {
       ->type_name("REPORT")
       ->allow_extra_args(false);
   command->add_option("--interval", options->interval, "how often a feature report is asked for")
-      ->check(CLI::Range(0.001, 1e6))
+      ->check(secondsBetween(0.001, 1e6))
       ->type_name("SECONDS")
       ->capture_default_str();
   command->add_flag("--changes-only", options->run.changesOnly,

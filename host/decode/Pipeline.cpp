@@ -7,6 +7,8 @@ namespace vesk::host {
 
 namespace {
 
+constexpr MessageKind kNothingFits{"nothing-fits", Severity::kWarning, kExitOk};
+
 constexpr std::size_t kWriteAt = std::size_t{256} << 10;  // how much output is gathered for one write
 
 }  // namespace
@@ -31,6 +33,7 @@ void Pipeline::begin() {
 }
 
 void Pipeline::report(const SourceReport &report) {
+  ++given_;
   countLoss(report);
   if (!filter_.wants(report)) return;
   const bool first = reports_++ == 0;
@@ -97,6 +100,13 @@ void Pipeline::finish() {
     if (!batch_->isEmpty()) workers_->put(std::move(batch_));
     workers_->drain();
   }
+  if (given_ != 0 && reports_ == 0)
+    messages_.add({&kNothingFits,
+                   {},
+                   {},
+                   {},
+                   "none of the " + std::to_string(given_) +
+                       " reports fits what --report, --type, --device, --from and --to ask for"});
   const Summary summary{reports_, &messages_};
   formatter_.end(buffer_, summary);
   flush();

@@ -53,7 +53,7 @@ class Pipeline : public ReadSink {
   Messages &messages_;
   OutputBuffer buffer_;
   LossCounter losses_;
-  std::uint64_t reports_ = 0;
+  std::uint64_t given_ = 0, reports_ = 0;  // before and behind the filter
   // With one thread:
   ReportPrinter printer_;
   std::vector<Message> reportMessages_;

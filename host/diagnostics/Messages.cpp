@@ -61,11 +61,12 @@ Severity Messages::add(Message message) {
 
 void Messages::finishFile(std::string_view file) {
   if (options_.verbose) return;  // each one was printed
-  for (const Kept &kept : kept_)
-    if (kept.first.file == file && kept.count > 1 && shows(kept.severity)) {
+  for (Kept &kept : kept_)
+    if (kept.first.file == file && kept.count > kept.told && shows(kept.severity)) {
       const Message total{kept.first.kind, kept.first.file, {}, {}, {}};
       print(total, kept.severity,
-            std::to_string(kept.count - 1) + " more of this kind (" + std::string(kept.first.kind->code) + ")");
+            std::to_string(kept.count - kept.told) + " more of this kind (" + std::string(kept.first.kind->code) + ")");
+      kept.told = kept.count;
     }
 }
 

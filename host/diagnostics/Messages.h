@@ -27,13 +27,14 @@ class Messages {
     Message first;
     Severity severity;
     std::uint64_t count = 1;
+    std::uint64_t told = 1;  // of these, printed or counted in a line of finishFile()
   };
 
   explicit Messages(const Options &options, std::FILE *stream = stderr) : options_(options), stream_(stream) {}
 
   /// Returns the severity that the message has under these options.
   Severity add(Message message);
-  /// Says how many of each kind were not printed for `file`. To be called once, when the file is done.
+  /// Says how many of each kind were not printed for `file` since it was said last. To be called when the file is done.
   void finishFile(std::string_view file);
 
   const std::vector<Kept> &kept() const { return kept_; }

@@ -72,9 +72,10 @@ class GzipBytes : public RawBytes {
   std::size_t read(char *out, std::size_t size) override {
     stream_.next_out = reinterpret_cast<Bytef *>(out);
     stream_.avail_out = static_cast<uInt>(size);
-    while (stream_.avail_out == size) {
-      const std::string_view input = packed_->peek();
+    while (stream_.avail_out == size && failure_.empty()) {
+      const std::string_view input = insideMember_ ? packed_->peek() : nextMember();
       if (input.empty()) {
+        packed_->checkEnd();
         if (insideMember_) throw InputError("the gzip data are cut off in the middle");
         return 0;
       }
@@ -87,17 +88,30 @@ class GzipBytes : public RawBytes {
         insideMember_ = false;
         inflateReset(&stream_);
       } else if (status != Z_OK && status != Z_BUF_ERROR) {
-        throw InputError(std::string("the gzip data are damaged: ") +
-                         (stream_.msg != nullptr ? stream_.msg : "unknown error"));
+        failure_ =
+            std::string("the gzip data are damaged: ") + (stream_.msg != nullptr ? stream_.msg : "unknown error");
       }
     }
+    if (stream_.avail_out == size) throw InputError(failure_);  // what was unpacked before comes first
     return size - stream_.avail_out;
   }
 
  private:
+  /// Behind a member, zeros pad the file; empty at its end.
+  std::string_view nextMember() {
+    std::string_view input = packed_->peek();
+    while (!isFirst_ && !input.empty() && input[0] == '\0') {
+      packed_->skip(std::min(input.find_first_not_of('\0'), input.size()));
+      input = packed_->peek();
+    }
+    isFirst_ = false;
+    return input;
+  }
+
   std::unique_ptr<ByteSource> packed_;
   z_stream stream_{};
-  bool insideMember_ = false;
+  bool insideMember_ = false, isFirst_ = true;
+  std::string failure_;
 };
 
 }  // namespace
@@ -132,11 +146,20 @@ std::string_view ByteSource::peek(std::size_t wanted) {
       begin_ = 0;
     }
     if (end_ == buffer_.size()) buffer_.resize(std::min(buffer_.size() * 2, kMostAhead));
-    const std::size_t got = raw_->read(buffer_.data() + end_, buffer_.size() - end_);
+    std::size_t got = 0;
+    try {
+      got = raw_->read(buffer_.data() + end_, buffer_.size() - end_);
+    } catch (const InputError &error) {  // what is at hand can be read all the same
+      failure_ = error.what();
+    }
     if (got == 0) atEnd_ = true;
     end_ += got;
   }
   return {buffer_.data() + begin_, end_ - begin_};
+}
+
+void ByteSource::checkEnd() const {
+  if (!failure_.empty()) throw InputError(failure_);
 }
 
 void ByteSource::skip(std::size_t size) {

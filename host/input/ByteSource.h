@@ -46,9 +46,11 @@ class ByteSource {
   /// Bytes that were taken so far, which is the offset of the next one.
   std::uint64_t offset() const { return taken_; }
 
-  /// All bytes that are at hand, at least `wanted` of them unless the input ends before. REQUIRES: wanted <=
-  /// kMostAhead. The view lives until the next call of anything but offset().
+  /// All bytes that are at hand, at least `wanted` of them unless the input ends before, or cannot be read any further.
+  /// REQUIRES: wanted <= kMostAhead. The view lives until the next call of anything but offset().
   std::string_view peek(std::size_t wanted = 1);
+  /// At the end: throws InputError where it is none, because the rest could not be read.
+  void checkEnd() const;
   /// Takes bytes that peek() has shown.
   void skip(std::size_t size);
 
@@ -62,6 +64,7 @@ class ByteSource {
   std::vector<char> buffer_;
   std::size_t begin_ = 0, end_ = 0;  // what is at hand
   bool atEnd_ = false;
+  std::string failure_;  // why nothing more could be read
   std::uint64_t taken_ = 0;
 };
 

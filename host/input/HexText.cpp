@@ -4,6 +4,8 @@
 #include "host/input/FoundReports.h"
 #include "host/input/HexTextReport.h"
 #include "host/input/PlainText.h"
+#include "host/input/RawBinary.h"
+#include "host/input/ReportBorders.h"
 #include "values/PrintfFormat.h"
 
 namespace vesk::host {
@@ -42,12 +44,12 @@ class HexTextReader {
         return finishReport();
       case Kind::kLabel:
         finishReport();
-        if (text.find_first_not_of(" \t{}[]();,") != std::string_view::npos)
-          found_.say(kTextSkipped, Place::line(number_), "words, taken as a label");
+        if (text.find_first_not_of(" \t{}[]();,") != std::string_view::npos) sayLabel();
         return;
       case Kind::kRepeat:
         return report_.addRepeat(number_);
       case Kind::kBad:
+        if (report_.isWhole()) finishReport();
         return report_.fail(kBadInput, number_, line_.problem());
       case Kind::kData:
         if (report_.endsBefore(line_)) finishReport();
@@ -59,16 +61,49 @@ class HexTextReader {
     if (report_.isEmpty()) return;
     report_.finish();
     if (const auto &problem = report_.problem()) {
-      found_.say(*problem->kind, Place::line(problem->line), problem->text);
+      sayProblem(*problem);
     } else {
       const Place place = Place::line(report_.firstLine());
       if (const auto offset = report_.beginsAt())
         found_.say(kDumpBegin, place,
                    "the dump begins at offset " + formatted<"0x%llX">(static_cast<unsigned long long>(*offset)) +
                        ", not at 0; its first byte is taken for the report ID");
+      sayBorders(place);
       found_.addUntyped(report_.bytes(), place);
     }
     report_.clear();
+  }
+
+  void sayLabel() {
+    const Place place = Place::line(number_);
+    if (const std::string_view digits = line_.likeReport(); !digits.empty())
+      found_.say(kReportBorder, place,
+                 "\"" + std::string(digits.substr(0, 24)) +
+                     "\" could be a report, but among words it is taken for a part of a label; in a line of its own it "
+                     "is one");
+    else
+      found_.say(kTextSkipped, place, "words, taken as a label");
+  }
+
+  /// A slip takes more with it than its line where a report is spread over several.
+  void sayProblem(const HexTextReport::Problem &problem) {
+    std::string text = problem.text;
+    if (report_.lastLine() > report_.firstLine())
+      text += "; lines " + std::to_string(report_.firstLine()) + " to " + std::to_string(report_.lastLine()) +
+              " are left out";
+    found_.say(*problem.kind, Place::line(problem.line), text);
+  }
+
+  /// What was taken for one report may be several.
+  void sayBorders(const Place &place) {
+    if (const std::size_t count = countReports(report_.bytes()); count > 1)
+      found_.say(kRawManyReports, place,
+                 "read as one report; its bytes would make " + std::to_string(count) +
+                     " reports one behind the other, between which empty lines are wanted");
+    else if (const std::uint64_t line = report_.suspectLine(); line != 0)
+      found_.say(kReportBorder, Place::line(line),
+                 "begins as a report does, but is taken for a part of the one that begins in line " +
+                     std::to_string(report_.firstLine()) + "; an empty line would part them");
   }
 
   ByteSource &source_;

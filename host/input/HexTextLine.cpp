@@ -47,7 +47,7 @@ bool beginsReport(std::string_view digits) {
 
 void HexTextLine::reset() {
   fields_.clear();
-  hasLabel_ = opensArray_ = colonOffset_ = parted_ = sawComment_ = false;
+  hasLabel_ = opensArray_ = colonOffset_ = parted_ = sawComment_ = python_ = false;
   isRun_ = true;
   words_ = likeHex_ = firstWordAt_ = textAt_ = 0;
   text_ = {};
@@ -102,7 +102,7 @@ void HexTextLine::scan(std::string_view line, std::size_t from) {
       std::size_t end = at;
       while (end < line.size() && isBlank(line[end])) ++end;
       if (end == line.size()) return;
-      if (endsField(line, at, end)) {
+      if (endsField(at, end)) {
         text_ = line.substr(end);
         textAt_ = end + 1;
         return;
@@ -140,10 +140,8 @@ void HexTextLine::scan(std::string_view line, std::size_t from) {
 
 /// Whether blanks from `from` to `to` end the hex field of a dump, so that its text column follows. Between fields
 /// there is one blank, or two in the middle of a line from hexdump -C.
-bool HexTextLine::endsField(std::string_view line, std::size_t from, std::size_t to) const {
-  const std::size_t blanks = to - from +
-                             static_cast<std::size_t>(std::count(line.begin() + static_cast<std::ptrdiff_t>(from),
-                                                                 line.begin() + static_cast<std::ptrdiff_t>(to), '\t'));
+bool HexTextLine::endsField(std::size_t from, std::size_t to) const {
+  const std::size_t blanks = to - from;
   if (fields_.size() < 2 || blanks < 2 || words_ != 0) return false;
   if (colonOffset_) return true;
   if (!mayHaveOffset()) return false;
@@ -154,8 +152,9 @@ void HexTextLine::takeField(std::string_view line, std::size_t begin, std::size_
   std::string_view word = line.substr(begin, end - begin);
   const bool prefixed = word.starts_with("0x") || word.starts_with("0X");
   const std::string_view digits = word.substr(prefixed ? 2 : 0);
-  // b'...' is how Python writes bytes, where most of them are no digits.
   const bool python = fields_.empty() && word == "b" && end < line.size() && (line[end] == '\'' || line[end] == '"');
+  python_ = python_ || python;
+  if (takeDashed(word, begin + 1)) return;
   if (isHex(digits) && !python) {
     fields_.push_back({digits, begin + 1, prefixed});
     isRun_ = isRun_ && !parted_;
@@ -168,12 +167,24 @@ void HexTextLine::takeField(std::string_view line, std::size_t begin, std::size_
   }
 }
 
+/// "e0-0d-05", which is not to be a date: it begins with the ID of a report.
+bool HexTextLine::takeDashed(std::string_view word, std::size_t column) {
+  if (word.size() < 5 || word.size() % 3 != 2 || !beginsReport(word)) return false;
+  for (std::size_t i = 0; i < word.size(); ++i)
+    if (i % 3 == 2 ? word[i] != '-' : hexDigit(word[i]) < 0) return false;
+  for (std::size_t i = 0; i < word.size(); i += 3) fields_.push_back({word.substr(i, 2), column + i, false});
+  likeHex_ += word.size() / 3 + 1;
+  return true;
+}
+
 /// A line with words: a label where most of it is words, with or without data behind it; else a slip.
 void HexTextLine::judgeWords(std::string_view line) {
   const std::size_t all = words_ + fields_.size(), likeHex = likeHex_;
   // Of one word and one number "length: 64" is a label; "0g 64" is a slip.
-  const bool keyed = (line.find(": ") != std::string_view::npos || line.find("= ") != std::string_view::npos) &&
+  const bool keyed = (line.find(": ") != std::string_view::npos || line.find("= ") != std::string_view::npos ||
+                      line.ends_with(':') || line.ends_with('=')) &&
                      !fields_.empty() && firstWordAt_ < fields_[0].column;
+  const bool python = python_;
   // A line with an offset is never a label.
   const bool offset = !fields_.empty() && fields_[0].column == 1 && fields_[0].digits.size() >= 6;
   const std::string problem =
@@ -183,7 +194,7 @@ void HexTextLine::judgeWords(std::string_view line) {
     kind_ = Kind::kData;
     hasLabel_ = true;
     isRun_ = false;
-  } else if (2 * likeHex < all + (keyed ? 1 : 0) && !offset) {
+  } else if (2 * likeHex < all + (keyed ? 1 : 0) && !offset && !python) {
     kind_ = Kind::kLabel;
   } else {
     fail(problem);
@@ -215,6 +226,22 @@ bool HexTextLine::dataBehindLabel(std::string_view line) {
 void HexTextLine::fail(std::string problem) {
   kind_ = Kind::kBad;
   problem_ = std::move(problem);
+}
+
+std::string_view HexTextLine::likeReport() const {
+  for (const Field &field : fields_)
+    if (field.digits.size() >= 4 && field.digits.size() % 2 == 0 && beginsReport(field.digits)) return field.digits;
+  return {};
+}
+
+std::string HexTextLine::bytes() const {
+  std::string bytes;
+  for (const Field &field : fields_) {
+    if (field.digits.size() == 1) bytes += static_cast<char>(hexDigit(field.digits[0]));
+    for (std::size_t i = 0; i + 1 < field.digits.size(); i += 2)
+      bytes += static_cast<char>(hexDigit(field.digits[i]) * 16 + hexDigit(field.digits[i + 1]));
+  }
+  return bytes;
 }
 
 bool HexTextLine::mayHaveOffset() const {

@@ -7,6 +7,7 @@
 #include "host/input/FoundReports.h"
 #include "host/input/HexTextLayout.h"
 #include "host/input/PlainText.h"
+#include "host/input/ReportBorders.h"
 #include "host/report/KnownReports.h"
 
 namespace vesk::host {
@@ -41,10 +42,12 @@ void HexTextReport::clear() {
   beginsAt_.reset();
   allRuns_ = equalRuns_ = true;
   runBytes_ = 0;
+  suspectLine_ = 0;
 }
 
 void HexTextReport::fail(const MessageKind &kind, std::uint64_t number, std::string text) {
   if (isEmpty()) firstLine_ = number;
+  lastLine_ = std::max(lastLine_, number);
   if (!problem_) problem_ = {&kind, number, std::move(text)};
 }
 
@@ -55,17 +58,23 @@ void HexTextReport::addRepeat(std::uint64_t number) {
 }
 
 /// A byte that is known to be the first of a report is not enough: it may as well stand in the middle of one. So a line
-/// begins a new report where an array or a dump begins, or where the report before it is whole.
+/// begins a new report where an array or a dump begins, or where the report before it is whole; behind a slip, where it
+/// is a whole report itself.
 bool HexTextReport::endsBefore(const HexTextLine &line) const {
   if (isEmpty()) return false;
   if (line.opensArray() || line.hasLabel()) return true;
   if (line.mayStartAtZero() && (rows_.empty() || !rows_[0].offset.empty())) return true;
-  if (problem_ || repeatAt_ || data_.empty()) return false;
+  if (problem_) return !line.hasColonOffset() && isWholeReport(line.bytes());
+  if (repeatAt_ || data_.empty()) return false;
   if (allRuns_ && line.isRun() && !line.hasColonOffset()) return !continuesRun(line);
-  if (rows_.size() != 1 || rows_[0].colon || !rows_[0].offset.empty()) return false;
-  const KnownReport *known = findReport(byteAt(data_, 0));
-  return known != nullptr && known->length != KnownReport::Length::kText && data_.size() == known->layoutSize &&
-         beginsReport(line.fields()[0].digits);
+  if (rows_[0].colon || !rows_[0].offset.empty()) return false;
+  return isWhole() && beginsReport(line.fields()[0].digits);
+}
+
+bool HexTextReport::isWhole() const {
+  if (problem_ || repeatAt_ || rows_.empty()) return false;
+  if (allRuns_ || (!rows_[0].colon && rows_[0].offset.empty())) return isWholeReport(data_);
+  return rows_.back().middle == data_.size();
 }
 
 /// Runs of digits are one report in lines of equal length, the last of which may be shorter, or one report a line. They
@@ -89,6 +98,7 @@ bool HexTextReport::continuesRun(const HexTextLine &line) const {
 
 void HexTextReport::add(const HexTextLine &line, std::uint64_t number) {
   if (isEmpty()) firstLine_ = number;
+  lastLine_ = number;
   if (problem_) return;
   if (const auto refusal = refuseLayout(line, rows_.empty())) return fail(*refusal->kind, number, refusal->text);
 
@@ -234,6 +244,10 @@ void HexTextReport::joinAsData() {
         kBadInput, *repeat,
         "\"*\" stands for repeated lines, but without offsets nobody knows how many; print it with 'od -An -v -tx1'");
   bytes_ = data_;
+  if (isWholeReport(bytes_)) return;
+  for (std::size_t i = 1; i < rows_.size() && suspectLine_ == 0; ++i)
+    if (rows_[i].begin < data_.size() && findReport(byteAt(data_, rows_[i].begin)) != nullptr)
+      suspectLine_ = rows_[i].line;
 }
 
 }  // namespace vesk::host

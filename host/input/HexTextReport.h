@@ -11,6 +11,8 @@
 
 namespace vesk::host {
 
+/// A line in the middle that could as well begin a report of its own.
+inline constexpr MessageKind kReportBorder{"report-border", Severity::kWarning, kExitOk};
 /// A dump whose first line is not at offset 0.
 inline constexpr MessageKind kDumpBegin{"dump-begin", Severity::kWarning, kExitOk};
 
@@ -26,6 +28,10 @@ class HexTextReport {
   /// No line was added since clear().
   bool isEmpty() const { return rows_.empty() && !problem_; }
   std::uint64_t firstLine() const { return firstLine_; }
+  std::uint64_t lastLine() const { return lastLine_; }
+
+  /// Whether nothing is missing: it is as long as its ID says, or a dump that ended with its last offset.
+  bool isWhole() const;
 
   /// Whether a data line begins another report than the one that is being gathered.
   bool endsBefore(const HexTextLine &line) const;
@@ -38,6 +44,8 @@ class HexTextReport {
   void finish();
   const std::string &bytes() const { return bytes_; }
   const std::optional<Problem> &problem() const { return problem_; }
+  /// A line that begins with a report ID, in a report that is not as long as its layout; 0 for none.
+  std::uint64_t suspectLine() const { return suspectLine_; }
   /// The offset of the first line where it is not 0.
   std::optional<std::uint64_t> beginsAt() const { return beginsAt_; }
 
@@ -64,7 +72,7 @@ class HexTextReport {
   std::vector<Row> rows_;
   std::string data_;  // all fields' bytes
   std::string bytes_;
-  std::uint64_t firstLine_ = 0;
+  std::uint64_t firstLine_ = 0, lastLine_ = 0, suspectLine_ = 0;
   std::optional<std::uint64_t> repeatAt_;  // the line of a "*" that no row has followed
   std::optional<Problem> problem_;
   std::optional<std::uint64_t> beginsAt_;

@@ -15,6 +15,7 @@ constexpr std::size_t kMostDevices = 256;
 struct Device {
   std::string name = "0";
   std::optional<std::uint32_t> vendorProduct;
+  std::uint32_t bus = SourceReport::kUsb;
   std::int64_t lastNs = 0;
 };
 
@@ -78,8 +79,9 @@ class RecordingReader {
   void takeIds(std::string_view rest) {
     const auto bus = parseNumber(takeWord(rest), 16), vendor = parseNumber(takeWord(rest), 16),
                product = parseNumber(takeWord(rest), 16);
-    if (!bus || !vendor || !product || *vendor > 0xFFFF || *product > 0xFFFF)
+    if (!bus || !vendor || !product || *bus > 0xFFFF || *vendor > 0xFFFF || *product > 0xFFFF)
       return bad("I: bus, vendor and product as hexadecimal numbers were expected");
+    device_->bus = static_cast<std::uint32_t>(*bus);
     device_->vendorProduct = static_cast<std::uint32_t>(*vendor << 16 | *product);
   }
 
@@ -105,6 +107,7 @@ class RecordingReader {
     report.timeNs = parseSeconds(time);
     report.device = device_->name;
     report.vendorProduct = device_->vendorProduct;
+    report.bus = device_->bus;
     judgeTime(report, time);
     found_.add(report);
   }

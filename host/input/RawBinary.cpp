@@ -5,7 +5,7 @@
 
 #include "host/input/FoundReports.h"
 #include "host/input/PlainText.h"
-#include "host/report/KnownReports.h"
+#include "host/input/ReportBorders.h"
 
 namespace vesk::host {
 
@@ -13,29 +13,6 @@ namespace {
 
 unsigned idAt(std::string_view bytes) {
   return static_cast<unsigned char>(bytes[0]);
-}
-
-/// How many bytes the report at the start of `bytes` has: what its ID says, or fewer at the end of the input. A text
-/// ends with its zero, and the zeros that pad it are its own, for no report has the ID 0. 0 for no report of ours.
-std::size_t reportLength(std::string_view bytes) {
-  const KnownReport *known = findReport(idAt(bytes));
-  if (known == nullptr) return 0;
-  if (known->length != KnownReport::Length::kText) return std::min<std::size_t>(known->layoutSize, bytes.size());
-  const std::size_t textEnd = bytes.find('\0', 1);
-  if (textEnd == std::string_view::npos) return bytes.size();
-  return std::min(bytes.find_first_not_of('\0', textEnd), bytes.size());
-}
-
-/// How many whole reports `bytes` are, one behind the other; 0 where something is left over.
-std::size_t countReports(std::string_view bytes) {
-  std::size_t count = 0;
-  while (!bytes.empty()) {
-    const std::size_t length = reportLength(bytes);
-    if (length == 0 || length < findReport(idAt(bytes))->layoutSize) return 0;
-    bytes.remove_prefix(length);
-    ++count;
-  }
-  return count;
 }
 
 std::uint64_t skipRest(ByteSource &source) {

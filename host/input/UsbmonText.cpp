@@ -2,6 +2,7 @@
 #include "host/input/UsbmonText.h"
 
 #include <map>
+#include <set>
 
 #include "host/input/FoundReports.h"
 #include "host/input/HidRecording.h"
@@ -17,6 +18,7 @@ namespace {
 
 constexpr std::size_t kMostRequests = 4096;  // that may wait for an answer; hardly ever are there two
 constexpr std::size_t kMostDevices = 1024;
+constexpr std::size_t kLargePiece = 64;  // what mice, keyboards and joysticks send is shorter
 
 class UsbmonReader {
  public:
@@ -144,6 +146,8 @@ class UsbmonReader {
                  "the answer begins with " + formatted<"0x%02X">(unsigned{static_cast<unsigned char>(bytes_[0])}) +
                      ", not with this ID; its bytes are decoded as what was asked for",
                  id);
+    else if (findReport(id) != nullptr && ours_.size() < kMostDevices)
+      ours_.insert({event.bus, event.device});
     hand(event, id, static_cast<ReportType>(wireType - 1), false, length);
   }
 
@@ -151,6 +155,17 @@ class UsbmonReader {
   void takeUnasked(const UsbmonEvent &event, std::uint64_t length) {
     const KnownReport *known = bytes_.empty() ? nullptr : findReport(static_cast<unsigned char>(bytes_[0]));
     const bool input = event.transfer == 'I';
+    if (input && known != nullptr && known->type == ReportType::kInput && length < known->layoutSize &&
+        (length >= kLargePiece || ours_.contains({event.bus, event.device}))) {
+      ++others_;
+      return found_.say(
+          kIncompleteReport, here(),
+          std::to_string(length) + " of " + std::to_string(known->layoutSize) +
+              " bytes came in this transfer; reports in pieces are put together from a pcap alone, as from "
+              "'tcpdump -i usbmon" +
+              std::to_string(event.bus) + " -w FILE'",
+          known->id);
+    }
     if (known == nullptr || length < known->layoutSize || (input && known->type != ReportType::kInput)) {
       if (length != 0) ++others_;
       return;
@@ -198,6 +213,7 @@ class UsbmonReader {
   FoundReports found_;
   std::map<Key, UsbRequest> requests_;  // by bus and tag
   std::map<Key, std::uint32_t> ids_;    // vendor and product by bus and device
+  std::set<Key> ours_;                  // the devices that have answered as the controller does
   std::string bytes_, device_;
   std::optional<std::uint32_t> lastMicroseconds_;
   std::int64_t elapsed_ = 0;  // microseconds since the first event

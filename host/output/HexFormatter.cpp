@@ -28,12 +28,11 @@ void appendComment(OutputBuffer &out, const SourceReport &report) {
 
 class HexFormatter : public Formatter {
  public:
-  void report(OutputBuffer &out, const SourceReport &report, const Decoded &, bool first,
-              std::vector<Finding> &) override {
-    if (!first) out.append('\n');
+  void report(OutputBuffer &out, const SourceReport &report, const Decoded &, bool, std::vector<Finding> &) override {
     appendComment(out, report);
     for (std::size_t at = 0; at < report.bytes.size(); at += kBytesALine)
       appendLine(out, report.bytes.substr(at, kBytesALine));
+    out.append('\n');
   }
 
  private:

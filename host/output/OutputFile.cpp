@@ -6,8 +6,11 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <climits>
+#include <csignal>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <utility>
 
 namespace vesk::host {
@@ -22,6 +25,55 @@ void widenPipe(int fd) {
   if (bytes > 0 && bytes < kPipeBytes) ::fcntl(fd, F_SETPIPE_SZ, kPipeBytes);
 }
 
+/// Where links lead. Of /dev/stdout and its like, which lead to an open descriptor, `isDescriptor` is true.
+struct Target {
+  std::string path;
+  bool isDescriptor = false;
+};
+
+Target followLinks(const std::string &path) {
+  constexpr int kMostLinks = 40;
+  std::filesystem::path at = path;
+  std::error_code error;
+  for (int links = 0; links < kMostLinks; ++links) {
+    const auto folder = std::filesystem::weakly_canonical(std::filesystem::absolute(at, error).parent_path(), error);
+    if (folder.native().starts_with("/proc/") && folder.filename() == "fd") return {path, true};
+    if (!std::filesystem::is_symlink(at, error)) break;
+    const std::filesystem::path next = std::filesystem::read_symlink(at, error);
+    at = next.is_absolute() ? next : at.parent_path() / next;
+  }
+  return {at.native(), false};
+}
+
+constexpr int kDeadlySignals[] = {SIGHUP, SIGINT, SIGQUIT, SIGTERM};
+
+char guarded[PATH_MAX];  // the temporary file that a deadly signal removes; empty for none
+
+extern "C" void removeGuarded(int number) {
+  if (guarded[0] != '\0') ::unlink(guarded);
+  ::signal(number, SIG_DFL);
+  ::raise(number);
+}
+
+/// Signals that would kill, and nobody else handles, remove the file first.
+void guard(const std::string &path) {
+  if (guarded[0] != '\0' || path.size() >= sizeof guarded) return;
+  std::memcpy(guarded, path.c_str(), path.size() + 1);
+  for (const int number : kDeadlySignals) {
+    struct sigaction now {};
+    if (::sigaction(number, nullptr, &now) == 0 && now.sa_handler == SIG_DFL) ::signal(number, removeGuarded);
+  }
+}
+
+void unguard(const std::string &path) {
+  if (path != guarded) return;
+  guarded[0] = '\0';
+  for (const int number : kDeadlySignals) {
+    struct sigaction now {};
+    if (::sigaction(number, nullptr, &now) == 0 && now.sa_handler == removeGuarded) ::signal(number, SIG_DFL);
+  }
+}
+
 }  // namespace
 
 OutputFile::OutputFile(const std::string &path) : name_(path == "-" ? "(standard output)" : path) {
@@ -30,20 +82,22 @@ OutputFile::OutputFile(const std::string &path) : name_(path == "-" ? "(standard
     return;
   }
   struct stat existing {};
-  // What is there and no regular file (a device, a FIFO) cannot be replaced and is written to as it is.
-  if (::stat(path.c_str(), &existing) == 0 && !S_ISREG(existing.st_mode)) {
-    fd_ = ::open(path.c_str(), O_WRONLY | O_CLOEXEC);
+  const Target target = followLinks(path);
+  // What is there and no regular file (a device, a FIFO, /dev/stdout) cannot be replaced and is written to as it is.
+  if (target.isDescriptor || (::stat(path.c_str(), &existing) == 0 && !S_ISREG(existing.st_mode))) {
+    fd_ = ::open(path.c_str(), O_WRONLY | O_CLOEXEC | (target.isDescriptor ? O_APPEND : 0));
     if (fd_ < 0) fail("cannot be opened");
     widenPipe(fd_);
     return;
   }
-  path_ = path;
-  temporary_ = path + ".XXXXXX";
+  path_ = target.path;
+  temporary_ = path_ + ".XXXXXX";
   fd_ = ::mkostemp(temporary_.data(), O_CLOEXEC);
   if (fd_ < 0) {
     temporary_.clear();
     fail("cannot be created");
   }
+  guard(temporary_);
   const mode_t mask = ::umask(0);
   ::umask(mask);
   ::fchmod(fd_, 0666 & ~mask);
@@ -51,7 +105,9 @@ OutputFile::OutputFile(const std::string &path) : name_(path == "-" ? "(standard
 
 OutputFile::~OutputFile() {
   if (fd_ > STDERR_FILENO) ::close(fd_);
-  if (!temporary_.empty()) ::unlink(temporary_.c_str());
+  if (temporary_.empty()) return;
+  ::unlink(temporary_.c_str());
+  unguard(temporary_);
 }
 
 void OutputFile::write(std::string_view bytes) {
@@ -61,7 +117,7 @@ void OutputFile::write(std::string_view bytes) {
     if (written >= 0) {
       bytes.remove_prefix(static_cast<std::size_t>(written));
       done += written;
-    } else if (errno == EPIPE) {
+    } else if (errno == EPIPE && fd_ == STDOUT_FILENO) {
       throw PipeClosed();
     } else if (errno != EINTR) {
       const int error = errno;
@@ -81,6 +137,7 @@ void OutputFile::takeBack(off_t size) {
 void OutputFile::publish() {
   if (temporary_.empty()) return;
   if (::rename(temporary_.c_str(), path_.c_str()) != 0) fail("cannot take its name");
+  unguard(temporary_);
   temporary_.clear();
 }
 

@@ -14,12 +14,13 @@ class OutputError : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
-/// Whoever read our output has stopped reading, which is no error.
+/// Whoever read our standard output has stopped reading, which is no error.
 class PipeClosed : public std::exception {};
 
 class OutputFile {
  public:
-  /// Standard output for "-". Otherwise a new file beside `path` that takes its name in commit(). Throws OutputError.
+  /// Standard output for "-". Otherwise a new file beside the one that `path` leads to, whose name it takes in
+  /// commit(); a signal that kills before removes it. Throws OutputError.
   explicit OutputFile(const std::string &path);
   /// Removes what was not committed.
   ~OutputFile();

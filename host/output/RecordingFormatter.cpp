@@ -19,7 +19,7 @@ void appendBytes(std::string &out, std::initializer_list<unsigned> bytes) {
   for (const unsigned byte : bytes) out += static_cast<char>(byte);
 }
 
-/// A report descriptor that declares the controller's reports, for those who replay the recording: an input does not
+/// A report descriptor that declares the controller's reports, for those who replay the recording: most inputs do not
 /// tell the device's own.
 std::string reportDescriptor() {
   std::string descriptor;
@@ -79,7 +79,7 @@ class RecordingFormatter : public Formatter {
       out.append(report.device);
     }
     const std::uint32_t ids = report.vendorProduct.value_or(0);
-    out.append(formatted<"\nI: 3 %04x %04x\n">(ids >> 16, ids & 0xFFFF));
+    out.append(formatted<"\nI: %x %04x %04x\n">(report.bus, ids >> 16, ids & 0xFFFF));
   }
 
   /// A report without a time has that of the one before it, so that the order stays what it was.

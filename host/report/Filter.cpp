@@ -11,6 +11,7 @@ namespace vesk::host {
 namespace {
 
 std::optional<std::uint32_t> parseHex(std::string_view digits) {
+  if (digits.starts_with("0x") || digits.starts_with("0X")) digits.remove_prefix(2);
   std::uint32_t value = 0;
   const auto [end, error] = std::from_chars(digits.data(), digits.data() + digits.size(), value, 16);
   if (error != std::errc() || end != digits.data() + digits.size() || value > 0xFFFF) return {};

@@ -44,6 +44,9 @@ struct SourceReport {
   std::optional<std::int64_t> timeNs;  // nanoseconds since the input's own zero
   std::string_view device;  // "1.7" for bus and address, "0" for a recording's device index; empty where unknown
   std::optional<std::uint32_t> vendorProduct;  // vendor << 16 | product, where the input tells
+  std::uint32_t bus = kUsb;                    // in the kernel's numbers; all but recordings hold USB traffic
+
+  static constexpr std::uint32_t kUsb = 3;
 };
 
 }  // namespace vesk::host

@@ -120,6 +120,9 @@ TEST(HexTextInput, ReadsPlainDigitsInEverySpelling) {
                            "{ 0xe0, 0x0d, 0x05, 0x00, 0x21, 0x40, 0x24 };",
                            "E0;0D;05;00;21;40;24",
                            "e0:0d:05:00:21:40:24",
+                           "E0-0D-05-00-21-40-24",
+                           "0000:\te0\t0d\t05\t00\t21\t40\t24\n",
+                           "0000\te0\t0d\t05\t00\t21\t40\t24\n",
                            "\"\\xe0\\x0d\\x05\\x00\\x21\\x40\\x24\"",
                            "\te0\t0d 05\t00   21 40 24  \r\n",
                            "\xef\xbb\xbf"
@@ -353,14 +356,71 @@ TEST(HexTextInput, NamesLineAndColumnOfASlip) {
   expectRefused("[118, 119, 100]", "bad-input", "decimal", "1", 4);
   expectRefused("e0 0d \xff\x01", "bad-input", "\\xff\\x01", "1", 4);
   expectRefused("b'\\xe0\\x0d\\x05'", "bad-input", "\"b\" in column 1", "1", 4);
+  expectRefused("x = b'\\xde\\x02'", "bad-input", "\"x\" in column 1", "1", 4);
   expectRefused("b\"\\xe0\\x0d\\x05\"", "bad-input", "\"b\" in column 1", "1", 4);
   expectRefused("/* e0 0d 05\n21 40\n", "bad-input", "does not end", "1", 4);
 }
 
 TEST(HexTextInput, LosesOneReportToASlipAndNoOther) {
   const ReadResult result = readInput("e0 0d 05 00 21 40 24\n\nde 0x\nde 01\n\nde 02\n");
-  EXPECT_THAT(result.bytes(), ElementsAre(kSummary, bytesOf("de02")));
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary, bytesOf("de01"), bytesOf("de02")));
   EXPECT_THAT(result.said(), ElementsAre("bad-input 3"));
+  // Neither the whole report before it, nor those that are whole in a line behind it.
+  const ReadResult around = readInput("de 00\nde 01\nzz 01\ne0 0d 05 00 21 40 24\nde 02\n");
+  EXPECT_THAT(around.bytes(), ElementsAre(bytesOf("de00"), bytesOf("de01"), kSummary, bytesOf("de02")));
+  EXPECT_THAT(around.said(), ElementsAre("bad-input 3"));
+  const ReadResult dump = readInput("00000000  de 01\n00000002\nde 0g\n");
+  EXPECT_THAT(dump.bytes(), ElementsAre(bytesOf("de01")));
+  EXPECT_THAT(dump.said(), ElementsAre("bad-input 3"));
+}
+
+TEST(HexTextInput, SaysWhichLinesASlipTakesWithIt) {
+  const ReadResult result = readInput("e3 00 00 00\n00 00 0g 00\n00 00 00 00\n\nde 01\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("de01")));
+  ASSERT_THAT(result.said(), ElementsAre("bad-input 2"));
+  EXPECT_THAT(result.messages[0].text, HasSubstr("\"0g\" in column 7"));
+  EXPECT_THAT(result.messages[0].text, HasSubstr("; lines 1 to 3 are left out"));
+}
+
+TEST(HexTextInput, AWholeReportOfSeveralLinesEndsWhereTheNextBegins) {
+  const std::string fault = numbered(0xE3, 57), version = bytesOf("d0312e3000");
+  for (const std::size_t size : {8u, 16u, 57u}) {
+    std::string text;
+    for (std::size_t at = 0; at < fault.size(); at += size)
+      text += digitsOf(std::string_view(fault).substr(at, size)) + "\n";
+    const ReadResult result = readInput(text + "de 02\nd0 31 2e 30 00\nde 01\n");
+    EXPECT_THAT(result.bytes(), ElementsAre(fault, bytesOf("de02"), version, bytesOf("de01"))) << size;
+    EXPECT_THAT(result.said(), IsEmpty()) << size;
+  }
+}
+
+TEST(HexTextInput, WhatMayBeSeveralReportsIsSaid) {
+  for (const char *text : {"DE 02, DE 01", "[\"DE 02\", \"DE 01\"]", "{0xDE,0x02},{0xDE,0x01}",
+                           "00000000: de02 de01                                ....\n"}) {
+    SCOPED_TRACE(text);
+    const ReadResult result = readInput(text);
+    EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("de02de01")));
+    ASSERT_THAT(result.said(), ElementsAre("raw-many-reports 1"));
+    EXPECT_THAT(result.messages[0].text, HasSubstr("would make 2 reports"));
+  }
+  // The last byte of the first one is missing, or the second line goes on with it.
+  const ReadResult result = readInput("e0 0d 05 00 21 40\nde 02\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("e00d05002140de02")));
+  EXPECT_THAT(result.said(), ElementsAre("report-border 2"));
+}
+
+TEST(HexTextInput, DigitsAmongWordsThatCouldBeAReportAreSaid) {
+  const ReadResult result = readInput("RX: e00d0500214024\nRX: de02\nRX: 1234\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary));
+  ASSERT_THAT(result.said(), ElementsAre("report-border 2"));
+  EXPECT_THAT(result.messages[0].text, HasSubstr("\"de02\" could be a report"));
+}
+
+TEST(HexTextInput, ADeclarationOverSeveralLinesHidesNoneBeforeIt) {
+  const ReadResult result =
+      readInput("uint8_t a[2] = { 0xDE, 0x02 };\nuint8_t b[] =\n{\n 0xE0, 0x0D, 0x05, 0x00,\n 0x21, 0x40, 0x24,\n};\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("de02"), kSummary));
+  EXPECT_THAT(result.said(), IsEmpty());
 }
 
 TEST(HexTextInput, SeparatesReportsByEmptyLines) {

@@ -30,7 +30,8 @@ TEST(Hex, namesEachReportAndShowsItsBytes) {
             "D0\n"
             "\n"
             "# feature 0x99, 1 byte\n"
-            "99\n");
+            "99\n"
+            "\n");
 }
 
 TEST(Raw, isTheBytes) {
