@@ -25,12 +25,15 @@ constexpr const char *kExitCodes =
     "  5  output could not be written\n";
 
 /// The arguments behind the program's name. "-decimal" is the plug-in's own spelling of an option and would be read as
-/// a bundle of one-letter options.
+/// a bundle of one-letter options; a file name in brackets would be read as a list of names.
 std::vector<std::string> takeArguments(int argc, char **argv) {
   std::vector<std::string> arguments(argv + std::min(argc, 1), argv + argc);
+  bool options = true, behindOption = false;
   for (std::string &argument : arguments) {
-    if (argument == "--") break;
-    if (argument == "-decimal") argument = "--decimal";
+    if (options && argument == "-decimal") argument = "--decimal";
+    if (!behindOption && argument.starts_with('[') && argument.ends_with(']')) argument.insert(0, "./");
+    options = options && argument != "--";
+    behindOption = options && argument.starts_with('-') && argument != "-";
   }
   return arguments;
 }

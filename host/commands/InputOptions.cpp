@@ -18,9 +18,7 @@ std::int64_t nanoseconds(const std::string &option, const std::string &text) {
 }  // namespace
 
 void InputOptions::addTo(CLI::App &command) {
-  command.add_option("files", files, "inputs of any kind; - or none is standard input")
-      ->type_name("FILE")
-      ->allow_extra_args(false);  // which would take a name in brackets for a list
+  command.add_option("files", files, "inputs of any kind; - or none is standard input")->type_name("FILE");
   command.add_option("--hex", hexReports, "a report as hex digits on the command line")
       ->type_name("TEXT")
       ->allow_extra_args(false);

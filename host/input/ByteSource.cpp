@@ -126,7 +126,9 @@ std::unique_ptr<ByteSource> ByteSource::open(const std::string &path, Watch watc
     if (fd < 0) throw InputError(std::strerror(errno));
   }
   auto source = std::make_unique<ByteSource>(name, std::make_unique<FileBytes>(fd, std::move(watch)));
-  if (!source->peek(2).starts_with("\x1f\x8b")) return source;
+  const std::string_view head = source->peek(2);
+  if (head.empty()) source->checkEnd();
+  if (!head.starts_with("\x1f\x8b")) return source;
   return std::make_unique<ByteSource>(name, std::make_unique<GzipBytes>(std::move(source)));
 }
 
@@ -176,6 +178,10 @@ bool ByteSource::nextLine(std::string_view &line) {
     if (searched + 1 > kMostAhead) throw InputError("a line is longer than 4 MiB");
     ahead = peek(searched + 1);
     if (ahead.size() == searched) break;  // the end, without a line feed
+  }
+  if (lineFeed == std::string_view::npos && !failure_.empty()) {  // nobody knows what the rest of it said
+    skip(ahead.size());
+    return false;
   }
   if (ahead.empty()) return false;
   line = ahead.substr(0, lineFeed);

@@ -55,7 +55,7 @@ class ByteSource {
   void skip(std::size_t size);
 
   /// The next line without its line end (LF or CR LF), and takes it; false at the end. A last line without a line end
-  /// counts. A line longer than kMostAhead - 1 ends with InputError.
+  /// counts, unless the input cannot be read any further. A line longer than kMostAhead - 1 ends with InputError.
   bool nextLine(std::string_view &line);
 
  private:

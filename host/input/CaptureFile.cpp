@@ -88,6 +88,7 @@ void CaptureFile::tell(const MessageKind &kind, Place place, std::string text) {
 std::string_view CaptureFile::whole(std::uint64_t size) {
   const std::string_view ahead = source_.peek(size);
   if (ahead.size() >= size) return ahead.substr(0, size);
+  source_.checkEnd();
   tellCut(size, ahead.size());
   return {};
 }
@@ -96,6 +97,7 @@ bool CaptureFile::passOver(std::uint64_t size) {
   for (std::uint64_t left = size; left != 0;) {
     const std::size_t count = std::min<std::uint64_t>(source_.peek(1).size(), left);
     if (count == 0) {
+      source_.checkEnd();
       tellCut(size, size - left);
       return false;
     }

@@ -41,6 +41,7 @@ void readSplit(ByteSource &source, FoundReports &found) {
       skipRest(source);
       return;
     }
+    if (length == bytes.size()) source.checkEnd();  // it may be a part only
     found.addUntyped(bytes.substr(0, length), place);
     source.skip(length);
   }
@@ -48,6 +49,7 @@ void readSplit(ByteSource &source, FoundReports &found) {
 
 void readOne(ByteSource &source, FoundReports &found) {
   const std::string_view bytes = source.peek(kMostReportBytes + 1);
+  source.checkEnd();
   const Place place = Place::offset(0);
   if (bytes.empty()) return;
   if (bytes.size() > kMostReportBytes) {

@@ -25,7 +25,8 @@ void widenPipe(int fd) {
   if (bytes > 0 && bytes < kPipeBytes) ::fcntl(fd, F_SETPIPE_SZ, kPipeBytes);
 }
 
-/// Where links lead. Of /dev/stdout and its like, which lead to an open descriptor, `isDescriptor` is true.
+/// Where links lead; empty where they lead round and round. Of /dev/stdout and its like, which lead to an open
+/// descriptor, `isDescriptor` is true.
 struct Target {
   std::string path;
   bool isDescriptor = false;
@@ -38,11 +39,11 @@ Target followLinks(const std::string &path) {
   for (int links = 0; links < kMostLinks; ++links) {
     const auto folder = std::filesystem::weakly_canonical(std::filesystem::absolute(at, error).parent_path(), error);
     if (folder.native().starts_with("/proc/") && folder.filename() == "fd") return {path, true};
-    if (!std::filesystem::is_symlink(at, error)) break;
+    if (!std::filesystem::is_symlink(at, error)) return {at.native(), false};
     const std::filesystem::path next = std::filesystem::read_symlink(at, error);
     at = next.is_absolute() ? next : at.parent_path() / next;
   }
-  return {at.native(), false};
+  return {};
 }
 
 constexpr int kDeadlySignals[] = {SIGHUP, SIGINT, SIGQUIT, SIGTERM};
@@ -89,6 +90,10 @@ OutputFile::OutputFile(const std::string &path) : name_(path == "-" ? "(standard
     if (fd_ < 0) fail("cannot be opened");
     widenPipe(fd_);
     return;
+  }
+  if (target.path.empty()) {
+    errno = ELOOP;
+    fail("cannot be created");
   }
   path_ = target.path;
   temporary_ = path_ + ".XXXXXX";

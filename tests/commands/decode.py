@@ -22,6 +22,8 @@ SESSION = ROOT / "examples/session.hid"
 
 def run(*arguments, code=0, **more):
     more = {"stdin": subprocess.DEVNULL, **more}
+    if more["stdin"] is None:
+        del more["stdin"]
     result = subprocess.run([PROGRAM, *map(str, arguments)], stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True,
                             timeout=60, **more)
     if result.returncode != code:
@@ -68,6 +70,24 @@ class Choices(unittest.TestCase):
             self.assertEqual(run("decode", "--jobs", count, SESSION).stdout, expected)
         self.assertIn("--jobs", run("decode", "--jobs", "0", SESSION, code=2).stderr)
 
+    def test_times_are_exact(self):
+        text = "".join(f"F: {time} 2 de 02\n" for time in ("1700000000.123457", "1700000001.654321", "1700000002.777777"))
+        for number in range(3):
+            time = text.splitlines()[number].split()[1]
+            self.assertEqual(ids("-", "--from", time, "--to", time, input=text, stdin=None), ["Fde"], time)
+        for time in ("nan", "inf", "x", "1.0000000001"):
+            self.assertIn("a time in seconds was expected", run("decode", SESSION, f"--from={time}", code=2).stderr)
+
+    def test_what_fits_nothing_is_told(self):
+        result = run("decode", SESSION, "--report", "0xDE", "--type", "input")
+        self.assertEqual(result.stderr, "warning: none of the 19 reports fits what --report, --type, --device, --from and --to "
+                                        "ask for\n")
+        self.assertEqual(result.stdout, "")
+
+    def test_a_recording_keeps_its_bus_and_its_ids(self):
+        text = "N: a pad\nI: 18 1234 abcd\nF: 000000.000000 2 de 02\n"
+        self.assertIn("\nI: 18 1234 abcd\n", run("convert", "-", input=text, stdin=None).stdout)
+
     def test_the_plug_ins_own_word(self):
         decimal = run("decode", "-decimal", "--hex", "DE 02").stdout
         self.assertEqual(decimal, run("decode", "--decimal", "--hex", "DE 02").stdout)
@@ -92,6 +112,20 @@ class Inputs(unittest.TestCase):
         self.assertIn(f"{spoilt}: error: the gzip data are damaged: ", result.stderr)
         self.assertRegex(result.stderr, r"note: packets \d+, ")
         self.assertIn('"value"', result.stdout)
+
+    def test_a_name_in_brackets_is_one_name(self):
+        (self.folder / "[a,b]").write_text("DE 02\n")
+        self.assertIn("CONTINUOUS", run("decode", "[a,b]", cwd=self.folder).stdout)
+        self.assertIn("CONTINUOUS", run("decode", "--", "[a,b]", cwd=self.folder).stdout)
+
+    def test_a_reader_that_leaves_takes_no_error_with_it(self):
+        for arguments, code in ((["--hex", "DE 02"], 0), (["--hex", "DE 02", "--hex", "DF 01"], 4)):
+            ours, theirs = os.pipe()
+            os.close(ours)
+            process = subprocess.run([PROGRAM, "decode", *arguments], stdin=subprocess.DEVNULL, stdout=theirs,
+                                     stderr=subprocess.DEVNULL, timeout=60)
+            os.close(theirs)
+            self.assertEqual(process.returncode, code)
 
     def test_a_folder_is_none(self):
         self.assertIn(f"{self.folder}: error: Is a directory", run("decode", self.folder, code=3).stderr)

@@ -29,6 +29,7 @@ class Dripping : public RawBytes {
 std::string takeAll(ByteSource &source) {
   std::string all;
   for (std::string_view ahead; !(ahead = source.peek()).empty(); source.skip(ahead.size())) all += ahead;
+  source.checkEnd();
   return all;
 }
 
@@ -120,6 +121,29 @@ TEST(ByteSource, NamesGzipThatIsCutOrDamaged) {
   EXPECT_THROW(takeAll(*ByteSource::open(file.path())), InputError);
   const FileOnDisk garbage(whole + "garbage");
   EXPECT_THROW(takeAll(*ByteSource::open(garbage.path())), InputError);
+}
+
+TEST(ByteSource, GivesWhatCameBeforeTheGzipDataFailed) {
+  std::string lines;
+  for (int i = 0; i < 3000; ++i) lines += "line " + std::to_string(i) + "\n";
+  const std::string whole = packed(lines);
+  for (const std::string &bytes : {whole + "garbage", whole.substr(0, whole.size() - 100)}) {
+    const FileOnDisk file(bytes);
+    const auto source = ByteSource::open(file.path());
+    std::string read;
+    for (std::string_view line; source->nextLine(line);) read += std::string(line) + "\n";
+    EXPECT_GT(read.size(), lines.size() / 2);
+    EXPECT_TRUE(lines.starts_with(read));  // whole lines only
+    EXPECT_THROW(source->checkEnd(), InputError);
+  }
+}
+
+TEST(ByteSource, TakesZerosBehindGzipDataForPadding) {
+  const std::string first = pattern(70'000);
+  const FileOnDisk file(packed(first) + std::string(1000, '\0'));
+  EXPECT_EQ(takeAll(*ByteSource::open(file.path())), first);
+  const FileOnDisk between(packed(first) + std::string(100, '\0') + packed("more"));
+  EXPECT_EQ(takeAll(*ByteSource::open(between.path())), first + "more");
 }
 
 TEST(ByteSource, SaysWhyAFileCannotBeOpened) {

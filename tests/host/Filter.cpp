@@ -42,7 +42,7 @@ TEST(Filter, TakesOneTypeAndOneDevice) {
 
 TEST(Filter, TakesADeviceByVendorAndProduct) {
   Filter filter;
-  filter.setDevice("1234:ABCD");
+  filter.setDevice("0x1234:0XABCD");
   SourceReport source = report(0xE0);
   source.device = "1.7";
   EXPECT_FALSE(filter.wants(source));

@@ -51,6 +51,19 @@ TEST(Messages, OneLineForEachCauseAndFileAndThenACount) {
   EXPECT_EQ(printed.messages.kept()[0].count, 5u);
 }
 
+TEST(Messages, AFileThatComesAgainIsCountedOnFromWhereItWas) {
+  Printed printed({});
+  for (std::uint64_t line = 1; line <= 2; ++line) printed.messages.add(about(kShortReport, Place::line(line)));
+  printed.messages.finishFile("s.hex");
+  printed.messages.finishFile("s.hex");
+  for (std::uint64_t line = 1; line <= 3; ++line) printed.messages.add(about(kShortReport, Place::line(line)));
+  printed.messages.finishFile("s.hex");
+  EXPECT_EQ(printed.text(),
+            "s.hex:1: error: 0xE0: text\n"
+            "s.hex: error: 1 more of this kind (short-report)\n"
+            "s.hex: error: 3 more of this kind (short-report)\n");
+}
+
 TEST(Messages, VerboseShowsNotesAndEveryOne) {
   Printed printed({.verbose = true});
   printed.messages.add(about(kTrailingBytes, Place::line(1)));

@@ -1,9 +1,11 @@
 // A file that appears whole or not at all.
 #include "host/output/OutputFile.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <csignal>
@@ -67,6 +69,75 @@ TEST_F(OutputFileTest, HasTheRightsThatAnyNewFileHas) {
   struct stat status {};
   ASSERT_EQ(::stat(path("out").c_str(), &status), 0);
   EXPECT_EQ(status.st_mode & 0777, 0640u);
+}
+
+TEST_F(OutputFileTest, FollowsLinksToTheFileThatTheyMean) {
+  std::filesystem::create_directory(path("folder"));
+  std::filesystem::create_symlink("folder/target", path("second"));
+  std::filesystem::create_symlink(path("second"), path("link"));
+  for (const char *text : {"new", "newer"}) {  // the target is made, then replaced
+    OutputFile file(path("link"));
+    file.write(text);
+    file.commit();
+    EXPECT_TRUE(std::filesystem::is_symlink(path("link")));
+    EXPECT_EQ(contents(path("folder/target")), text);
+  }
+  EXPECT_EQ(filesThere(), 3u);
+}
+
+TEST_F(OutputFileTest, WritesToAnOpenDescriptorWhereALinkLeadsToOne) {
+  std::FILE *open = std::fopen(path("open").c_str(), "w");
+  ASSERT_NE(open, nullptr);
+  std::fputs("before ", open);
+  std::fflush(open);
+  std::filesystem::create_symlink("/proc/self/fd/" + std::to_string(::fileno(open)), path("link"));
+  {
+    OutputFile file(path("link"));
+    file.write("here");
+    file.commit();
+  }
+  std::fclose(open);
+  EXPECT_TRUE(std::filesystem::is_symlink(path("link")));
+  EXPECT_EQ(contents(path("open")), "before here");
+}
+
+TEST_F(OutputFileTest, LinksWithoutAnEndAreAnError) {
+  std::filesystem::create_symlink(path("b"), path("a"));
+  std::filesystem::create_symlink(path("a"), path("b"));
+  EXPECT_THROW(OutputFile(path("a")).commit(), OutputError);
+}
+
+TEST_F(OutputFileTest, ASignalThatKillsRemovesWhatIsNotWhole) {
+  for (const int number : {SIGHUP, SIGINT, SIGTERM}) {
+    const pid_t child = ::fork();
+    if (child == 0) {
+      OutputFile file(path("out"));
+      file.write("half");
+      ::raise(number);
+      ::_exit(0);
+    }
+    int status = 0;
+    ASSERT_EQ(::waitpid(child, &status, 0), child);
+    EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == number) << number;
+    EXPECT_EQ(filesThere(), 0u) << number;
+  }
+  {
+    OutputFile file(path("out"));
+    file.commit();
+  }
+  struct sigaction now {};
+  ASSERT_EQ(::sigaction(SIGTERM, nullptr, &now), 0);
+  EXPECT_EQ(now.sa_handler, SIG_DFL) << "afterwards signals do what they did";
+}
+
+TEST_F(OutputFileTest, AReaderOfANamedPipeThatLeavesIsAnError) {
+  ASSERT_EQ(::mkfifo(path("pipe").c_str(), 0600), 0);
+  const int reader = ::open(path("pipe").c_str(), O_RDONLY | O_NONBLOCK);
+  OutputFile file(path("pipe"));
+  ::close(reader);
+  const auto before = std::signal(SIGPIPE, SIG_IGN);
+  EXPECT_THROW(file.write("gone"), OutputError);
+  std::signal(SIGPIPE, before);
 }
 
 TEST_F(OutputFileTest, WritesToADeviceAsItIs) {

@@ -184,6 +184,20 @@ TEST(UsbmonTextInput, DataWithoutARequestAreReportsOnlyWhereTheyCanBe) {
   }
 }
 
+TEST(UsbmonTextInput, TellsInputReportsThatComeInPieces) {
+  const std::string piece =
+      "aa 9 C Ii:1:007:1 0:8 64 = 76000700 05000000 00000000 00000000 00000000 00000000 00000000 00000000\n";
+  const ReadResult result = readInput(kAsk + kAnswer + piece);
+  EXPECT_THAT(result.bytes(), ElementsAre(kSummary));
+  EXPECT_THAT(result.said(), ElementsAre("incomplete-report 3", "usbmon-summary"));
+  EXPECT_EQ(result.messages[0].reportId, 0x76u);
+  EXPECT_THAT(result.messages[0].text, HasSubstr("64 of 792 bytes"));
+  // Small ones are the controller's where something else has shown that the device is.
+  const std::string small = "aa 9 C Ii:1:007:1 0:8 8 = 76000700 05000000\n";
+  EXPECT_THAT(readInput(kAsk + kAnswer + small).said(), ElementsAre("incomplete-report 3", "usbmon-summary"));
+  EXPECT_THAT(readInput(small).said(), ElementsAre("usbmon-summary", "no-reports"));
+}
+
 TEST(UsbmonTextInput, TheUsersTypeIsNoGuess) {
   vesk::host::ReadOptions options;
   options.forcedType = ReportType::kInput;
