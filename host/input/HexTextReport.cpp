@@ -42,7 +42,7 @@ void HexTextReport::clear() {
   beginsAt_.reset();
   allRuns_ = equalRuns_ = true;
   runBytes_ = 0;
-  suspectLine_ = 0;
+  suspectLine_ = expected_ = 0;
 }
 
 void HexTextReport::fail(const MessageKind &kind, std::uint64_t number, std::string text) {
@@ -73,7 +73,8 @@ bool HexTextReport::endsBefore(const HexTextLine &line) const {
 
 bool HexTextReport::isWhole() const {
   if (problem_ || repeatAt_ || rows_.empty()) return false;
-  if (allRuns_ || (!rows_[0].colon && rows_[0].offset.empty())) return isWholeReport(data_);
+  if (allRuns_ || (!rows_[0].colon && rows_[0].offset.empty()))
+    return data_.size() >= expected_ && (data_.size() == expected_ || isWholeReport(data_));
   return rows_.back().middle == data_.size();
 }
 

@@ -25,12 +25,15 @@ class HexTextReport {
   };
 
   void clear();
+  /// How many bytes the report has that is about to be added, where something says it; 0 where nothing does.
+  void expect(std::uint64_t bytes) { expected_ = bytes; }
   /// No line was added since clear().
   bool isEmpty() const { return rows_.empty() && !problem_; }
   std::uint64_t firstLine() const { return firstLine_; }
   std::uint64_t lastLine() const { return lastLine_; }
 
-  /// Whether nothing is missing: it is as long as its ID says, or a dump that ended with its last offset.
+  /// Whether nothing is missing: it is as long as was expected, else as its ID says, or a dump that ended with its last
+  /// offset.
   bool isWhole() const;
 
   /// Whether a data line begins another report than the one that is being gathered.
@@ -44,6 +47,8 @@ class HexTextReport {
   void finish();
   const std::string &bytes() const { return bytes_; }
   const std::optional<Problem> &problem() const { return problem_; }
+  /// Whether its length is the one that was expected.
+  bool isAsExpected() const { return expected_ != 0 && bytes_.size() == expected_; }
   /// A line that begins with a report ID, in a report that is not as long as its layout; 0 for none.
   std::uint64_t suspectLine() const { return suspectLine_; }
   /// The offset of the first line where it is not 0.
@@ -73,6 +78,7 @@ class HexTextReport {
   std::string data_;  // all fields' bytes
   std::string bytes_;
   std::uint64_t firstLine_ = 0, lastLine_ = 0, suspectLine_ = 0;
+  std::uint64_t expected_ = 0;
   std::optional<std::uint64_t> repeatAt_;  // the line of a "*" that no row has followed
   std::optional<Problem> problem_;
   std::optional<std::uint64_t> beginsAt_;

@@ -394,6 +394,22 @@ TEST(HexTextInput, AWholeReportOfSeveralLinesEndsWhereTheNextBegins) {
   }
 }
 
+TEST(HexTextInput, OurOwnCommentsSayTheLength) {
+  const std::string text = "\xd0" + std::string(14, '\0') + "\x31\xd0" + std::string(14, '\0') + "\x32\xde\x02";
+  const std::string lines =
+      digitsOf(text.substr(0, 16)) + "\n" + digitsOf(text.substr(16, 16)) + "\n" + digitsOf(text.substr(32)) + "\n";
+  const std::string comment = "# feature 0xD0 version, 34 bytes, device 1.7\n";
+  for (const std::string between : {"", "\n"}) {
+    const ReadResult result = readInput(comment + lines + between + comment + lines);
+    EXPECT_THAT(result.bytes(), ElementsAre(text, text));
+    EXPECT_THAT(result.said(), IsEmpty());
+  }
+  EXPECT_EQ(readInput("# feature 0xD0, 17 bytes\n" + lines).bytes().size(), 2u) << "within the second line";
+  for (const char *other : {"# feature 0xD0 version\n", "# feature 0xD0, 34 words\n", "# feature 0xD0, x bytes\n",
+                            "# a feature 0xD0, 34 bytes\n"})
+    EXPECT_EQ(readInput(other + lines).bytes().size(), 3u) << other;
+}
+
 TEST(HexTextInput, WhatMayBeSeveralReportsIsSaid) {
   for (const char *text : {"DE 02, DE 01", "[\"DE 02\", \"DE 01\"]", "{0xDE,0x02},{0xDE,0x01}",
                            "00000000: de02 de01                                ....\n"}) {
