@@ -10,7 +10,8 @@ namespace {
 /// Exact, as inputs tell it: a double would miss a report whose time is given since 1970.
 std::int64_t nanoseconds(const std::string &option, const std::string &text) {
   const bool negative = text.starts_with('-');
-  const auto time = parseSeconds(std::string_view(text).substr(negative ? 1 : 0));
+  const std::string digits = text.substr(negative ? 1 : 0);
+  const auto time = parseSeconds(digits.starts_with('.') ? "0" + digits : digits);
   if (!time) throw CLI::ValidationError(option, "a time in seconds was expected, as 12 or 0.004120, not " + text);
   return negative ? -*time : *time;
 }

@@ -105,8 +105,9 @@ void Pipeline::finish() {
                    {},
                    {},
                    {},
-                   "none of the " + std::to_string(given_) +
-                       " reports fits what --report, --type, --device, --from and --to ask for"});
+                   std::string(given_ == 1 ? "the only report does not fit"
+                                           : "none of the " + std::to_string(given_) + " reports fits") +
+                       " what --report, --type, --device, --from and --to ask for"});
   const Summary summary{reports_, &messages_};
   formatter_.end(buffer_, summary);
   flush();

@@ -6,6 +6,7 @@
 
 #include "host/input/FoundReports.h"
 #include "host/input/PlainText.h"
+#include "host/input/ReportBorders.h"
 #include "host/report/KnownReports.h"
 #include "values/PrintfFormat.h"
 
@@ -55,6 +56,7 @@ void HexTextLine::reset() {
 
 void HexTextLine::parse(std::string_view line) {
   reset();
+  likeReport_ = {};
   if (!inComment_ && line.find_first_not_of(" \t*") == std::string_view::npos &&
       std::count(line.begin(), line.end(), '*') == 1) {
     kind_ = Kind::kRepeat;
@@ -102,7 +104,7 @@ void HexTextLine::scan(std::string_view line, std::size_t from) {
       std::size_t end = at;
       while (end < line.size() && isBlank(line[end])) ++end;
       if (end == line.size()) return;
-      if (endsField(at, end)) {
+      if (endsField(line, at, end)) {
         text_ = line.substr(end);
         textAt_ = end + 1;
         return;
@@ -140,8 +142,13 @@ void HexTextLine::scan(std::string_view line, std::size_t from) {
 
 /// Whether blanks from `from` to `to` end the hex field of a dump, so that its text column follows. Between fields
 /// there is one blank, or two in the middle of a line from hexdump -C.
-bool HexTextLine::endsField(std::size_t from, std::size_t to) const {
-  const std::size_t blanks = to - from;
+bool HexTextLine::endsField(std::string_view line, std::size_t from, std::size_t to) const {
+  const auto tabs = static_cast<std::size_t>(std::count(line.begin() + static_cast<std::ptrdiff_t>(from),
+                                                        line.begin() + static_cast<std::ptrdiff_t>(to), '\t'));
+  // A tab ends it too, unless tabs are what parts the bytes.
+  const std::string_view next = line.substr(to, std::min(line.find_first_of(" \t", to), line.size()) - to);
+  const bool goesOn = to - from == 1 && isHex(next) && fields_.size() > 1 && next.size() == fields_[1].digits.size();
+  const std::size_t blanks = to - from + (goesOn ? 0 : tabs);
   if (fields_.size() < 2 || blanks < 2 || words_ != 0) return false;
   if (colonOffset_) return true;
   if (!mayHaveOffset()) return false;
@@ -153,8 +160,8 @@ void HexTextLine::takeField(std::string_view line, std::size_t begin, std::size_
   const bool prefixed = word.starts_with("0x") || word.starts_with("0X");
   const std::string_view digits = word.substr(prefixed ? 2 : 0);
   const bool python = fields_.empty() && word == "b" && end < line.size() && (line[end] == '\'' || line[end] == '"');
-  python_ = python_ || python;
-  if (takeDashed(word, begin + 1)) return;
+  python_ = python_ || (python && line.find("\\x", end) != std::string_view::npos);
+  if (takeDashed(line, begin, end)) return;
   if (isHex(digits) && !python) {
     fields_.push_back({digits, begin + 1, prefixed});
     isRun_ = isRun_ && !parted_;
@@ -167,13 +174,21 @@ void HexTextLine::takeField(std::string_view line, std::size_t begin, std::size_
   }
 }
 
-/// "e0-0d-05", which is not to be a date: it begins with the ID of a report.
-bool HexTextLine::takeDashed(std::string_view word, std::size_t column) {
-  if (word.size() < 5 || word.size() % 3 != 2 || !beginsReport(word)) return false;
+/// "e0-0d-05-00", which is not to be a date or a range of reports: it stands alone, or begins with the ID of a report.
+bool HexTextLine::takeDashed(std::string_view line, std::size_t begin, std::size_t end) {
+  std::string_view word = line.substr(begin, end - begin);
+  if (word.ends_with('-')) word.remove_suffix(1);  // it goes on in the next line
+  if (word.size() < 5 || word.size() % 3 != 2) return false;
+  std::string bytes;
   for (std::size_t i = 0; i < word.size(); ++i)
     if (i % 3 == 2 ? word[i] != '-' : hexDigit(word[i]) < 0) return false;
-  for (std::size_t i = 0; i < word.size(); i += 3) fields_.push_back({word.substr(i, 2), column + i, false});
-  likeHex_ += word.size() / 3 + 1;
+  for (std::size_t i = 0; i < word.size(); i += 3)
+    bytes += static_cast<char>(hexDigit(word[i]) * 16 + hexDigit(word[i + 1]));
+  const bool isAlone = fields_.empty() && words_ == 0 && line.find_first_not_of(" \t", end) == std::string_view::npos;
+  const bool isLong = isAlone ? bytes.size() >= 3 : bytes.size() >= 4 && beginsReport(word);
+  if (!isLong && !isWholeReport(bytes)) return false;
+  for (std::size_t i = 0; i < word.size(); i += 3) fields_.push_back({word.substr(i, 2), begin + 1 + i, false});
+  likeHex_ += bytes.size();
   return true;
 }
 
@@ -183,7 +198,7 @@ void HexTextLine::judgeWords(std::string_view line) {
   // Of one word and one number "length: 64" is a label; "0g 64" is a slip.
   const bool keyed = (line.find(": ") != std::string_view::npos || line.find("= ") != std::string_view::npos ||
                       line.ends_with(':') || line.ends_with('=')) &&
-                     !fields_.empty() && firstWordAt_ < fields_[0].column;
+                     fields_.size() == 1 && firstWordAt_ < fields_[0].column;
   const bool python = python_;
   // A line with an offset is never a label.
   const bool offset = !fields_.empty() && fields_[0].column == 1 && fields_[0].digits.size() >= 6;
@@ -218,7 +233,9 @@ bool HexTextLine::dataBehindLabel(std::string_view line) {
     if (hasBrace && *from == brace) return true;
     // A number behind a word need not be a report: "length: 64".
     const std::string_view first = fields_[0].digits;
-    if (!colonOffset_ && beginsReport(first) && (fields_.size() > 1 || first.size() >= 14)) return true;
+    if (colonOffset_ || !beginsReport(first)) continue;
+    if (fields_.size() > 1 || first.size() >= 14) return true;
+    if (first.size() >= 4 && first.size() % 2 == 0 && !fields_[0].prefixed) likeReport_ = first;
   }
   return false;
 }
@@ -226,12 +243,6 @@ bool HexTextLine::dataBehindLabel(std::string_view line) {
 void HexTextLine::fail(std::string problem) {
   kind_ = Kind::kBad;
   problem_ = std::move(problem);
-}
-
-std::string_view HexTextLine::likeReport() const {
-  for (const Field &field : fields_)
-    if (field.digits.size() >= 4 && field.digits.size() % 2 == 0 && beginsReport(field.digits)) return field.digits;
-  return {};
 }
 
 std::string HexTextLine::bytes() const {

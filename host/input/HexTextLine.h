@@ -53,8 +53,8 @@ class HexTextLine {
   std::size_t textColumnAt() const { return textAt_; }
   /// A comment has begun and goes on in the next line.
   bool isInComment() const { return inComment_; }
-  /// Of a label: the first of its numbers that could be a report; empty where there is none.
-  std::string_view likeReport() const;
+  /// Of a label: what stands behind its colon and could be a report; empty where there is no such thing.
+  std::string_view likeReport() const { return likeReport_; }
   /// The bytes that the fields stand for, as far as they are such.
   std::string bytes() const;
   /// Of a bad line: what is wrong, with its column.
@@ -63,9 +63,9 @@ class HexTextLine {
  private:
   void reset();
   void scan(std::string_view line, std::size_t from);
-  bool endsField(std::size_t from, std::size_t to) const;
+  bool endsField(std::string_view line, std::size_t from, std::size_t to) const;
   void takeField(std::string_view line, std::size_t begin, std::size_t end);
-  bool takeDashed(std::string_view word, std::size_t column);
+  bool takeDashed(std::string_view line, std::size_t begin, std::size_t end);
   void judgeWords(std::string_view line);
   bool dataBehindLabel(std::string_view line);
   void fail(std::string problem);
@@ -73,13 +73,14 @@ class HexTextLine {
   Kind kind_ = Kind::kBlank;
   std::vector<Field> fields_;
   bool hasLabel_ = false, opensArray_ = false, colonOffset_ = false, isRun_ = false, parted_ = false;
-  bool python_ = false;  // b'...' or b"...", where most bytes are no digits
+  bool python_ = false;  // b'\\x..' or b"\\x..", where most bytes are no digits
   bool inComment_ = false, sawComment_ = false;
   std::size_t words_ = 0, likeHex_ = 0;
   std::string_view firstWord_;
   std::size_t firstWordAt_ = 0;
   std::string_view text_;
   std::size_t textAt_ = 0;
+  std::string_view likeReport_;
   std::string problem_;
 };
 

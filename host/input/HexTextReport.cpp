@@ -68,7 +68,13 @@ bool HexTextReport::endsBefore(const HexTextLine &line) const {
   if (repeatAt_ || data_.empty()) return false;
   if (allRuns_ && line.isRun() && !line.hasColonOffset()) return !continuesRun(line);
   if (rows_[0].colon || !rows_[0].offset.empty()) return false;
-  return isWhole() && beginsReport(line.fields()[0].digits);
+  return isWhole() && !mayGoOn() && beginsReport(line.fields()[0].digits);
+}
+
+/// A text may have bytes behind its zero, so where its last line is as long as a full one it need not be the last.
+bool HexTextReport::mayGoOn() const {
+  const std::size_t first = rowEnd(0), last = data_.size() - rows_.back().begin;
+  return expected_ == 0 && isTextReport(data_) && last == first && (first % 8 == 0 || first == kPlainRun);
 }
 
 bool HexTextReport::isWhole() const {
@@ -245,10 +251,13 @@ void HexTextReport::joinAsData() {
         kBadInput, *repeat,
         "\"*\" stands for repeated lines, but without offsets nobody knows how many; print it with 'od -An -v -tx1'");
   bytes_ = data_;
-  if (isWholeReport(bytes_)) return;
-  for (std::size_t i = 1; i < rows_.size() && suspectLine_ == 0; ++i)
-    if (rows_[i].begin < data_.size() && findReport(byteAt(data_, rows_[i].begin)) != nullptr)
-      suspectLine_ = rows_[i].line;
+  if (isWholeReport(bytes_) && !isTextReport(bytes_)) return;
+  const std::size_t length = reportLength(bytes_);
+  for (std::size_t i = 1; i < rows_.size() && suspectLine_ == 0; ++i) {
+    const std::string_view row = std::string_view(data_).substr(rows_[i].begin, rowEnd(i) - rows_[i].begin);
+    const bool isBehind = rows_[i].begin >= length && reportLength(row) != 0;
+    if (!row.empty() && (isBehind || isWholeReport(row))) suspectLine_ = rows_[i].line;
+  }
 }
 
 }  // namespace vesk::host

@@ -67,6 +67,7 @@ class HexTextReport {
 
   void addBytes(const HexTextLine &line, std::uint64_t number, Row &row);
   bool continuesRun(const HexTextLine &line) const;
+  bool mayGoOn() const;
   bool hasOffsets() const;
   std::vector<int> bases() const;
   void joinByOffsets();

@@ -28,7 +28,14 @@ bool isWholeReport(std::string_view bytes) {
   const KnownReport *known = bytes.empty() ? nullptr : reportAt(bytes);
   if (known == nullptr) return false;
   if (known->length == KnownReport::Length::kText) return bytes.find('\0', 1) != std::string_view::npos;
-  return bytes.size() == known->layoutSize;
+  if (known->length == KnownReport::Length::kExact) return bytes.size() == known->layoutSize;
+  return bytes.size() >= known->layoutSize &&
+         bytes.find_first_not_of('\0', known->layoutSize) == std::string_view::npos;
+}
+
+bool isTextReport(std::string_view bytes) {
+  const KnownReport *known = bytes.empty() ? nullptr : reportAt(bytes);
+  return known != nullptr && known->length == KnownReport::Length::kText;
 }
 
 std::size_t countReports(std::string_view bytes) {

@@ -11,8 +11,12 @@ namespace vesk::host {
 /// REQUIRES: !bytes.empty().
 std::size_t reportLength(std::string_view bytes);
 
-/// Whether `bytes` are a report of ours that lacks nothing: as long as its layout, or a text with its zero.
+/// Whether `bytes` are a report of ours that lacks nothing: as long as its layout and padded with zeros at most, where
+/// it may be padded, or a text with its zero.
 bool isWholeReport(std::string_view bytes);
+
+/// Whether `bytes` begin as a report does whose length its ID does not tell.
+bool isTextReport(std::string_view bytes);
 
 /// How many whole reports `bytes` are, one behind the other; 0 where something is left over.
 std::size_t countReports(std::string_view bytes);

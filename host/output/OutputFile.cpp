@@ -11,6 +11,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <optional>
 #include <utility>
 
 namespace vesk::host {
@@ -25,21 +26,22 @@ void widenPipe(int fd) {
   if (bytes > 0 && bytes < kPipeBytes) ::fcntl(fd, F_SETPIPE_SZ, kPipeBytes);
 }
 
-/// Where links lead; empty where they lead round and round. Of /dev/stdout and its like, which lead to an open
-/// descriptor, `isDescriptor` is true.
+/// Where a path leads: /dev/stdout and its like to a descriptor that is open already.
 struct Target {
   std::string path;
-  bool isDescriptor = false;
+  int descriptor = -1;
 };
 
-Target followLinks(const std::string &path) {
+/// Nothing where links lead round and round.
+std::optional<Target> followLinks(const std::string &path) {
   constexpr int kMostLinks = 40;
+  const std::string ourFolder = "/proc/" + std::to_string(::getpid()) + "/fd";
   std::filesystem::path at = path;
   std::error_code error;
   for (int links = 0; links < kMostLinks; ++links) {
     const auto folder = std::filesystem::weakly_canonical(std::filesystem::absolute(at, error).parent_path(), error);
-    if (folder.native().starts_with("/proc/") && folder.filename() == "fd") return {path, true};
-    if (!std::filesystem::is_symlink(at, error)) return {at.native(), false};
+    if (folder == ourFolder) return Target{path, std::atoi(at.filename().c_str())};
+    if (!std::filesystem::is_symlink(at, error)) return Target{at.native()};
     const std::filesystem::path next = std::filesystem::read_symlink(at, error);
     at = next.is_absolute() ? next : at.parent_path() / next;
   }
@@ -79,23 +81,26 @@ void unguard(const std::string &path) {
 
 OutputFile::OutputFile(const std::string &path) : name_(path == "-" ? "(standard output)" : path) {
   if (path == "-") {
+    isShared_ = true;
     widenPipe(fd_);
     return;
   }
   struct stat existing {};
-  const Target target = followLinks(path);
+  const auto target = followLinks(path);
+  if (!target) {
+    errno = ELOOP;
+    fail("cannot be created");
+  }
   // What is there and no regular file (a device, a FIFO, /dev/stdout) cannot be replaced and is written to as it is.
-  if (target.isDescriptor || (::stat(path.c_str(), &existing) == 0 && !S_ISREG(existing.st_mode))) {
-    fd_ = ::open(path.c_str(), O_WRONLY | O_CLOEXEC | (target.isDescriptor ? O_APPEND : 0));
+  isShared_ = target->descriptor >= 0;
+  if (isShared_ || (::stat(path.c_str(), &existing) == 0 && !S_ISREG(existing.st_mode))) {
+    fd_ = isShared_ ? ::fcntl(target->descriptor, F_DUPFD_CLOEXEC, STDERR_FILENO + 1)
+                    : ::open(path.c_str(), O_WRONLY | O_CLOEXEC);
     if (fd_ < 0) fail("cannot be opened");
     widenPipe(fd_);
     return;
   }
-  if (target.path.empty()) {
-    errno = ELOOP;
-    fail("cannot be created");
-  }
-  path_ = target.path;
+  path_ = target->path;
   temporary_ = path_ + ".XXXXXX";
   fd_ = ::mkostemp(temporary_.data(), O_CLOEXEC);
   if (fd_ < 0) {
@@ -122,7 +127,7 @@ void OutputFile::write(std::string_view bytes) {
     if (written >= 0) {
       bytes.remove_prefix(static_cast<std::size_t>(written));
       done += written;
-    } else if (errno == EPIPE && fd_ == STDOUT_FILENO) {
+    } else if (errno == EPIPE && isShared_) {
       throw PipeClosed();
     } else if (errno != EINTR) {
       const int error = errno;

@@ -47,6 +47,7 @@ class OutputFile {
   std::string path_;       // empty for standard output
   std::string temporary_;  // empty once it was renamed
   int fd_ = 1;
+  bool isShared_ = false;  // a descriptor that we were given: standard output
 };
 
 }  // namespace vesk::host

@@ -127,6 +127,14 @@ class Inputs(unittest.TestCase):
             os.close(theirs)
             self.assertEqual(process.returncode, code)
 
+    def test_dev_stdout_is_standard_output(self):
+        shared = self.folder / "shared"
+        command = f"echo one; '{PROGRAM}' decode --hex 'DE 01' -O /dev/stdout; echo two"
+        with shared.open("w") as file:
+            subprocess.run(["sh", "-c", command], stdout=file, check=True, timeout=60)
+        self.assertEqual(shared.read_text(), "one\n\nADC Dump State: SINGLE\n\ntwo\n")
+        self.assertIn("No such file", run("decode", "--hex", "DE 01", "-O", "", code=5).stderr)
+
     def test_a_folder_is_none(self):
         self.assertIn(f"{self.folder}: error: Is a directory", run("decode", self.folder, code=3).stderr)
 

@@ -406,8 +406,63 @@ TEST(HexTextInput, OurOwnCommentsSayTheLength) {
   }
   EXPECT_EQ(readInput("# feature 0xD0, 17 bytes\n" + lines).bytes().size(), 2u) << "within the second line";
   for (const char *other : {"# feature 0xD0 version\n", "# feature 0xD0, 34 words\n", "# feature 0xD0, x bytes\n",
-                            "# a feature 0xD0, 34 bytes\n"})
-    EXPECT_EQ(readInput(other + lines).bytes().size(), 3u) << other;
+                            "# a feature 0xD0, 34 bytes\n"}) {
+    const ReadResult result = readInput(other + lines);
+    EXPECT_THAT(result.bytes(), ElementsAre(text)) << other;
+    EXPECT_THAT(result.said(), ElementsAre("report-border 3")) << other;
+  }
+}
+
+TEST(HexTextInput, ATextMayHaveOldBytesBehindItsZero) {
+  const std::string text = bytesOf("d0342e372e322d31313833000000000076312e30206f6c640000000000000000");
+  for (const std::size_t size : {8u, 16u}) {
+    std::string lines;
+    for (std::size_t at = 0; at < text.size(); at += size)
+      lines += digitsOf(std::string_view(text).substr(at, size)) + "\n";
+    const ReadResult result = readInput(lines);
+    EXPECT_THAT(result.bytes(), ElementsAre(text));
+    EXPECT_EQ(result.said().size(), 1u);  // "v1.0" could be an image
+  }
+}
+
+TEST(HexTextInput, ReportsPaddedWithZerosAreWhole) {
+  const std::string row = "00 00 00 00 00 00 00 00\n", report = "e0 0d 05 00 21 40 24 00\n" + row;
+  const ReadResult result = readInput(report + report + "de 02 00 00 00 00 00 00\n" + row);
+  EXPECT_EQ(result.reports.size(), 3u);
+  EXPECT_THAT(result.said(), IsEmpty());
+  // An ID within the layout begins nothing.
+  EXPECT_THAT(readInput("dc " + digitsOf(std::string(15, '\x01')) + "\ne0 " + digitsOf(std::string(8, '\x01')) +
+                        " 00 00 00 00 00 00 00\n")
+                  .said(),
+              IsEmpty());
+}
+
+TEST(HexTextInput, DashesPartBytes_NotDatesAndRanges) {
+  EXPECT_THAT(readInput("D0-34-2E-37-\n2E-31-00\n").bytes(), ElementsAre(bytesOf("d0342e372e3100")));
+  EXPECT_THAT(readInput("DE-02\n").bytes(), ElementsAre(bytesOf("de02")));
+  for (const char *label : {"Reports E0-E5 of unit 3", "part 76-11", "E0-E5", "Log of E1-02-03", "the 11-14-23"}) {
+    const ReadResult result = readInput(std::string(label) + "\nE0 01 02 03\n04 05 06\n");
+    EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("e0010203040506"))) << label;
+    EXPECT_THAT(result.said(), IsEmpty()) << label;
+  }
+}
+
+TEST(HexTextInput, WordsAreLabelsWhateverTheyHold) {
+  for (const char *label :
+       {"log got b'OK'", "the device is dead", "commit e1a2b3c4 fixed", "serial 7712345678 found"}) {
+    const ReadResult result = readInput(std::string(label) + "\nE0 01 02 03\n04 05 06\n");
+    EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("e0010203040506"))) << label;
+    EXPECT_THAT(result.said(), IsEmpty()) << label;
+  }
+  EXPECT_THAT(readInput("Feature report: E0 05 zz 00\n\nDE 01\n").said(), ElementsAre("bad-input 1"));
+  EXPECT_THAT(readInput("Get feature report of it: E0 0D 05 0g 00 00 00\n\nDE 01\n").said(),
+              ElementsAre("bad-input 1"));
+}
+
+TEST(HexTextInput, OneTabMayStandBeforeTheTextColumn) {
+  for (const char *text : {"00000000:\te0 01 02 03 04 05 06\t.......\n", "00000000\te0 01 02 03 04 05 06\t.......\n",
+                           "0000:\te0\t01\t02\t03\t04\t05\t06\t.......\n"})
+    expectOne(text, bytesOf("e0010203040506"));
 }
 
 TEST(HexTextInput, WhatMayBeSeveralReportsIsSaid) {
