@@ -1,6 +1,8 @@
 // Device options.
 #include "host/commands/DeviceOptions.h"
 
+#include <cmath>
+
 #include "host/report/KnownReports.h"
 
 namespace vesk::host {

@@ -256,7 +256,7 @@ void HexTextReport::joinAsData() {
   for (std::size_t i = 1; i < rows_.size() && suspectLine_ == 0; ++i) {
     const std::string_view row = std::string_view(data_).substr(rows_[i].begin, rowEnd(i) - rows_[i].begin);
     const bool isBehind = rows_[i].begin >= length && reportLength(row) != 0;
-    if (!row.empty() && (isBehind || isWholeReport(row))) suspectLine_ = rows_[i].line;
+    if (isBehind || isWholeReport(row)) suspectLine_ = rows_[i].line;
   }
 }
 

@@ -59,6 +59,7 @@ class Choices(unittest.TestCase):
         self.assertEqual(ids(SESSION, "--to", "0.0042"), ["Fd0", "Fd2"])
         self.assertEqual(ids(SESSION, "--from", "4"), ["Fea"])
         self.assertEqual(ids("--hex", "DE 02", "--from", "1"), [])
+        self.assertEqual(ids(SESSION, "--from", "-1", "--to", ".0042"), ["Fd0", "Fd2"])
 
     def test_devices(self):
         self.assertEqual(len(ids(SESSION, "--device", "1234:5678")), 19)
@@ -117,6 +118,7 @@ class Inputs(unittest.TestCase):
         (self.folder / "[a,b]").write_text("DE 02\n")
         self.assertIn("CONTINUOUS", run("decode", "[a,b]", cwd=self.folder).stdout)
         self.assertIn("CONTINUOUS", run("decode", "--", "[a,b]", cwd=self.folder).stdout)
+        self.assertIn("[a: error: No such file", run("decode", "[a", cwd=self.folder, code=3).stderr)
 
     def test_a_reader_that_leaves_takes_no_error_with_it(self):
         for arguments, code in ((["--hex", "DE 02"], 0), (["--hex", "DE 02", "--hex", "DF 01"], 4)):

@@ -281,6 +281,8 @@ class Streams(Commands):
             self.refused("a time from 0.001 to 1000000 seconds was expected", "record", "--feature", text)
         self.refused("use jsonl", "watch", "-o", "json")
         self.refused("--interval", "watch", "--interval", "0")
+        self.refused("nan is no number of seconds", "watch", "--duration", "nan")
+        self.refused("--interval", "watch", "--interval", "x")
 
     def test_a_device_that_goes_while_it_is_asked(self):
         self.bench.add(inputs=[])

@@ -404,6 +404,7 @@ TEST(HexTextInput, OurOwnCommentsSayTheLength) {
     EXPECT_THAT(result.bytes(), ElementsAre(text, text));
     EXPECT_THAT(result.said(), IsEmpty());
   }
+  EXPECT_THAT(readInput(comment + lines + "e0 0d\n").bytes(), ElementsAre(text, bytesOf("e00d")));
   EXPECT_EQ(readInput("# feature 0xD0, 17 bytes\n" + lines).bytes().size(), 2u) << "within the second line";
   for (const char *other : {"# feature 0xD0 version\n", "# feature 0xD0, 34 words\n", "# feature 0xD0, x bytes\n",
                             "# a feature 0xD0, 34 bytes\n"}) {
@@ -425,6 +426,24 @@ TEST(HexTextInput, ATextMayHaveOldBytesBehindItsZero) {
   }
 }
 
+TEST(HexTextInput, ATextEndsWhereItsLastLineIsShorter) {
+  const std::string text = "\xd0" + std::string(20, 'v') + std::string(5, '\0');
+  const std::string rows = digitsOf(text.substr(0, 16)) + "\n" + digitsOf(text.substr(16)) + "\n";
+  const ReadResult result = readInput(rows + "de 02\n");
+  EXPECT_THAT(result.bytes(), ElementsAre(text, bytesOf("de02")));
+  EXPECT_THAT(result.said(), IsEmpty());
+  // In lines as long as 'xxd -p' makes them it may go on.
+  const std::string thirty = "\xd0" + std::string(28, 'v') + std::string(1, '\0');
+  const ReadResult goesOn = readInput(digitsOf(thirty) + "\n" + digitsOf(thirty) + "\n");
+  EXPECT_THAT(goesOn.bytes(), ElementsAre(thirty + thirty));
+  EXPECT_THAT(goesOn.said(), ElementsAre("raw-many-reports 1"));
+}
+
+TEST(HexTextInput, ASlipInADumpTakesTheDumpWithIt) {
+  EXPECT_THAT(readInput("00000000: de01  ..\nde 0g\n").said(), ElementsAre("bad-input 2"));
+  EXPECT_THAT(readInput("000000 e1 00 00 00\n*\nzz 01\n").said(), ElementsAre("bad-input 3"));
+}
+
 TEST(HexTextInput, ReportsPaddedWithZerosAreWhole) {
   const std::string row = "00 00 00 00 00 00 00 00\n", report = "e0 0d 05 00 21 40 24 00\n" + row;
   const ReadResult result = readInput(report + report + "de 02 00 00 00 00 00 00\n" + row);
@@ -440,6 +459,9 @@ TEST(HexTextInput, ReportsPaddedWithZerosAreWhole) {
 TEST(HexTextInput, DashesPartBytes_NotDatesAndRanges) {
   EXPECT_THAT(readInput("D0-34-2E-37-\n2E-31-00\n").bytes(), ElementsAre(bytesOf("d0342e372e3100")));
   EXPECT_THAT(readInput("DE-02\n").bytes(), ElementsAre(bytesOf("de02")));
+  EXPECT_THAT(readInput("e0 0d E1-02-03-04-05\n").bytes(), ElementsAre(bytesOf("e00de102030405")));
+  EXPECT_THAT(readInput("E0-0D-05-00-21-40-24 # one\n").bytes(), ElementsAre(kSummary));
+  EXPECT_THAT(readInput("device 11-22-33-44-55\nDE 02\n").bytes(), ElementsAre(bytesOf("de02")));
   for (const char *label : {"Reports E0-E5 of unit 3", "part 76-11", "E0-E5", "Log of E1-02-03", "the 11-14-23"}) {
     const ReadResult result = readInput(std::string(label) + "\nE0 01 02 03\n04 05 06\n");
     EXPECT_THAT(result.bytes(), ElementsAre(bytesOf("e0010203040506"))) << label;
@@ -455,6 +477,7 @@ TEST(HexTextInput, WordsAreLabelsWhateverTheyHold) {
     EXPECT_THAT(result.said(), IsEmpty()) << label;
   }
   EXPECT_THAT(readInput("Feature report: E0 05 zz 00\n\nDE 01\n").said(), ElementsAre("bad-input 1"));
+  EXPECT_THAT(readInput("the variable here is x = b'\\xde\\x02' now\n\nDE 01\n").said(), ElementsAre("bad-input 1"));
   EXPECT_THAT(readInput("Get feature report of it: E0 0D 05 0g 00 00 00\n\nDE 01\n").said(),
               ElementsAre("bad-input 1"));
 }
@@ -481,7 +504,7 @@ TEST(HexTextInput, WhatMayBeSeveralReportsIsSaid) {
 }
 
 TEST(HexTextInput, DigitsAmongWordsThatCouldBeAReportAreSaid) {
-  const ReadResult result = readInput("RX: e00d0500214024\nRX: de02\nRX: 1234\n");
+  const ReadResult result = readInput("RX: e00d0500214024\nRX: de02\nRX: 1234\nRX: de021\nRX: 0xde02\n");
   EXPECT_THAT(result.bytes(), ElementsAre(kSummary));
   ASSERT_THAT(result.said(), ElementsAre("report-border 2"));
   EXPECT_THAT(result.messages[0].text, HasSubstr("\"de02\" could be a report"));

@@ -137,7 +137,7 @@ TEST(HidRecordingInput, NamesSlips) {
 
 TEST(HidRecordingInput, NumbersThatAreTooLargeAreSlips) {
   const std::string report = "E: 000000.000000 2 de 01\n";
-  for (const std::string line : {"D: 65536", "I: 3 10000 5678", "I: 3 1234 10000", "I: 3 1234"}) {
+  for (const std::string line : {"D: 65536", "I: 10000 1234 5678", "I: 3 10000 5678", "I: 3 1234 10000", "I: 3 1234"}) {
     const ReadResult result = readInput("D: 0\n" + line + "\n" + report, "hid-recording");
     EXPECT_THAT(result.said(), ElementsAre("bad-input 2")) << line;
     ASSERT_EQ(result.reports.size(), 1u) << line;

@@ -130,6 +130,17 @@ TEST_F(OutputFileTest, ASignalThatKillsRemovesWhatIsNotWhole) {
   EXPECT_EQ(now.sa_handler, SIG_DFL) << "afterwards signals do what they did";
 }
 
+TEST_F(OutputFileTest, TwoAtOnceAndSignalsThatAreIgnored) {
+  const auto before = std::signal(SIGHUP, SIG_IGN);
+  {
+    OutputFile first(path("first")), second(path("second"));
+    second.commit();
+    first.commit();
+  }
+  EXPECT_EQ(std::signal(SIGHUP, before), SIG_IGN) << "stays ignored";
+  EXPECT_EQ(filesThere(), 2u);
+}
+
 TEST_F(OutputFileTest, AReaderOfANamedPipeThatLeavesIsAnError) {
   ASSERT_EQ(::mkfifo(path("pipe").c_str(), 0600), 0);
   const int reader = ::open(path("pipe").c_str(), O_RDONLY | O_NONBLOCK);

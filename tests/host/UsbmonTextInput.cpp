@@ -198,6 +198,23 @@ TEST(UsbmonTextInput, TellsInputReportsThatComeInPieces) {
   EXPECT_THAT(readInput(small).said(), ElementsAre("usbmon-summary", "no-reports"));
 }
 
+TEST(UsbmonTextInput, RemembersNoMoreDevicesThanABusHas) {
+  std::string text;
+  for (int device = 100; device < 1200; ++device) {
+    const std::string address = "Ci:1:" + std::to_string(device) + ":0 ";
+    text += "aa 1 S " + address + "s a1 01 03de 0000 0002 2 <\naa 2 C " + address + "0 2 = de01\n";
+  }
+  const auto small = [](const char *device) {
+    return "aa 9 C Ii:1:" + std::string(device) + ":1 0:8 8 = 76000700 05000000\n";
+  };
+  EXPECT_THAT(readInput(text + small("100")).said(), ElementsAre("incomplete-report 2201", "usbmon-summary"));
+  EXPECT_THAT(readInput(text + small("1199")).said(), ElementsAre("usbmon-summary"));
+  // An answer to what is no report of ours shows nothing.
+  EXPECT_THAT(
+      readInput("aa 1 S Ci:1:007:0 s a1 01 0301 0000 0002 2 <\naa 2 C Ci:1:007:0 0 2 = 0102\n" + small("007")).said(),
+      ElementsAre("usbmon-summary"));
+}
+
 TEST(UsbmonTextInput, TheUsersTypeIsNoGuess) {
   vesk::host::ReadOptions options;
   options.forcedType = ReportType::kInput;
