@@ -16,6 +16,8 @@ namespace {
 
 using namespace vesk::host;
 
+constexpr std::string_view kOutOfMemory = "vesk-report: error: out of memory\n";
+
 constexpr const char *kExitCodes =
     "Exit codes, the highest that applies:\n"
     "  0  all well\n"
@@ -48,8 +50,7 @@ void occupyStandardDescriptors() {
 /// Memory that runs out while the command line is put together does so in functions of its library that must not throw,
 /// which would end in abort(). Nothing has been opened yet.
 [[noreturn]] void endWithoutMemory() {
-  constexpr std::string_view kText = "vesk-report: error: out of memory\n";
-  [[maybe_unused]] const auto written = ::write(STDERR_FILENO, kText.data(), kText.size());
+  [[maybe_unused]] const auto written = ::write(STDERR_FILENO, kOutOfMemory.data(), kOutOfMemory.size());
   ::_exit(kExitUnreadable);
 }
 
@@ -113,7 +114,7 @@ int main(int argc, char **argv) {
     std::fprintf(stderr, "vesk-report: error: %s\n", error.what());
     return kExitOutput;
   } catch (const std::bad_alloc &) {
-    std::fputs("vesk-report: error: out of memory\n", stderr);
+    std::fputs(kOutOfMemory.data(), stderr);
     return kExitUnreadable;
   } catch (const std::exception &error) {
     std::fprintf(stderr, "vesk-report: error: %s\n", error.what());

@@ -27,12 +27,7 @@ void run(Options &options, CommandContext &context) {
   Messages messages(messageOptions);
   const auto formatter = options.output.makeFormatter();
   Pipeline pipeline(options.output.pipeline(), options.input.filter, *formatter, output, messages);
-  try {
-    pipeline.begin();
-    readInputs(options.input, pipeline);
-    pipeline.finish();
-  } catch (const PipeClosed &) {  // what was found before it left counts
-  }
+  runInputs(options.input, pipeline);
   context.exitCode = messages.exitCode();
 }
 

@@ -117,12 +117,7 @@ void explainReports(const Options &options, CommandContext &context) {
   OutputFile output("-");
   const auto formatter = makeFieldsFormatter();
   Pipeline pipeline({}, options.input.filter, *formatter, output, messages);
-  try {
-    pipeline.begin();
-    readInputs(options.input, pipeline);
-    pipeline.finish();
-  } catch (const PipeClosed &) {  // what was found before it left counts
-  }
+  runInputs(options.input, pipeline);
   context.exitCode = messages.exitCode();
 }
 

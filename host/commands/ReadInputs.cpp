@@ -55,4 +55,13 @@ void readInputs(const InputOptions &options, Pipeline &pipeline) {
   if (options.files.empty() && options.hexReports.empty()) readFile("-", options, pipeline);
 }
 
+void runInputs(const InputOptions &options, Pipeline &pipeline) {
+  try {
+    pipeline.begin();
+    readInputs(options, pipeline);
+    pipeline.finish();
+  } catch (const PipeClosed &) {  // what was found before it left counts
+  }
+}
+
 }  // namespace vesk::host

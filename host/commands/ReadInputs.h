@@ -9,4 +9,7 @@ namespace vesk::host {
 /// Reads them all, one after the other; standard input where there are none. What cannot be read becomes a message.
 void readInputs(const InputOptions &options, Pipeline &pipeline);
 
+/// From the pipeline's beginning to its end, which comes early where the reader of standard output leaves.
+void runInputs(const InputOptions &options, Pipeline &pipeline);
+
 }  // namespace vesk::host

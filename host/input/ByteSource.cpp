@@ -97,20 +97,19 @@ class GzipBytes : public RawBytes {
   }
 
  private:
-  /// Behind a member, zeros pad the file; empty at its end.
+  /// What follows the zeros that may pad the file behind a member; empty at its end.
   std::string_view nextMember() {
     std::string_view input = packed_->peek();
-    while (!isFirst_ && !input.empty() && input[0] == '\0') {
+    while (!input.empty() && input[0] == '\0') {
       packed_->skip(std::min(input.find_first_not_of('\0'), input.size()));
       input = packed_->peek();
     }
-    isFirst_ = false;
     return input;
   }
 
   std::unique_ptr<ByteSource> packed_;
   z_stream stream_{};
-  bool insideMember_ = false, isFirst_ = true;
+  bool insideMember_ = false;
   std::string failure_;
 };
 

@@ -7,10 +7,6 @@ namespace vesk::host {
 
 namespace {
 
-/// The smallest piece by which data of a device that is not known to be the controller are taken for its own at once:
-/// what mice, keyboards and joysticks send is shorter.
-constexpr std::size_t kLargePiece = 64;
-
 /// Whether a transfer of this size may be the first piece of a report, which is to say, filled the buffer it had.
 bool mayBePiece(std::size_t size, const UsbEndpoint &endpoint) {
   if (endpoint.packetSize != 0) return size % endpoint.packetSize == 0;

@@ -4,7 +4,6 @@
 #include "host/input/FoundReports.h"
 #include "host/input/HexTextReport.h"
 #include "host/input/PlainText.h"
-#include "host/input/RawBinary.h"
 #include "host/input/ReportBorders.h"
 #include "values/PrintfFormat.h"
 
@@ -75,7 +74,7 @@ class HexTextReader {
   }
 
   void finishReport() {
-    if (report_.isEmpty()) return;
+    if (report_.isEmpty()) return report_.clear();
     report_.finish();
     if (const auto &problem = report_.problem()) {
       sayProblem(*problem);

@@ -143,13 +143,14 @@ void HexTextLine::scan(std::string_view line, std::size_t from) {
 /// Whether blanks from `from` to `to` end the hex field of a dump, so that its text column follows. Between fields
 /// there is one blank, or two in the middle of a line from hexdump -C.
 bool HexTextLine::endsField(std::string_view line, std::size_t from, std::size_t to) const {
+  if (fields_.size() < 2 || words_ != 0) return false;
   const auto tabs = static_cast<std::size_t>(std::count(line.begin() + static_cast<std::ptrdiff_t>(from),
                                                         line.begin() + static_cast<std::ptrdiff_t>(to), '\t'));
   // A tab ends it too, unless tabs are what parts the bytes.
   const std::string_view next = line.substr(to, std::min(line.find_first_of(" \t", to), line.size()) - to);
-  const bool goesOn = to - from == 1 && isHex(next) && fields_.size() > 1 && next.size() == fields_[1].digits.size();
+  const bool goesOn = to - from == 1 && isHex(next) && next.size() == fields_[1].digits.size();
   const std::size_t blanks = to - from + (goesOn ? 0 : tabs);
-  if (fields_.size() < 2 || blanks < 2 || words_ != 0) return false;
+  if (blanks < 2) return false;
   if (colonOffset_) return true;
   if (!mayHaveOffset()) return false;
   return blanks > 2 || fields_.size() != 1 + kHalf;

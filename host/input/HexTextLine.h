@@ -73,7 +73,7 @@ class HexTextLine {
   Kind kind_ = Kind::kBlank;
   std::vector<Field> fields_;
   bool hasLabel_ = false, opensArray_ = false, colonOffset_ = false, isRun_ = false, parted_ = false;
-  bool python_ = false;  // b'\\x..' or b"\\x..", where most bytes are no digits
+  bool python_ = false;  // Python's b'\x..', where most bytes may be no digits
   bool inComment_ = false, sawComment_ = false;
   std::size_t words_ = 0, likeHex_ = 0;
   std::string_view firstWord_;

@@ -52,6 +52,7 @@ void HexTextReport::fail(const MessageKind &kind, std::uint64_t number, std::str
 }
 
 void HexTextReport::addRepeat(std::uint64_t number) {
+  lastLine_ = number;
   if (problem_) return;
   if (rows_.empty()) return fail(kBadInput, number, "\"*\" repeats a line, but there is none before it");
   repeatAt_ = number;

@@ -7,8 +7,6 @@ namespace vesk::host {
 
 /// More bytes than any report has, and nobody said that they are many.
 inline constexpr MessageKind kRawTooLong{"raw-too-long", Severity::kError, kExitFindings};
-/// One report as it was read, whose bytes would also make several.
-inline constexpr MessageKind kRawManyReports{"raw-many-reports", Severity::kWarning, kExitOk};
 /// Split input that goes on with a byte that is no report ID, so that nobody can say where the next report begins.
 inline constexpr MessageKind kRawNoReportId{"raw-no-report-id", Severity::kError, kExitFindings};
 

@@ -4,7 +4,12 @@
 #include <cstddef>
 #include <string_view>
 
+#include "host/diagnostics/Message.h"
+
 namespace vesk::host {
+
+/// One report as it was read, whose bytes would also make several.
+inline constexpr MessageKind kRawManyReports{"raw-many-reports", Severity::kWarning, kExitOk};
 
 /// How many bytes the report at the start of `bytes` has: what its ID says, or fewer at the end of the input. A text
 /// ends with its zero, and the zeros that pad it are its own, for no report has the ID 0. 0 for no report of ours.

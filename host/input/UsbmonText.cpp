@@ -18,7 +18,6 @@ namespace {
 
 constexpr std::size_t kMostRequests = 4096;  // that may wait for an answer; hardly ever are there two
 constexpr std::size_t kMostDevices = 1024;
-constexpr std::size_t kLargePiece = 64;  // what mice, keyboards and joysticks send is shorter
 
 class UsbmonReader {
  public:

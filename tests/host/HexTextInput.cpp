@@ -414,6 +414,11 @@ TEST(HexTextInput, OurOwnCommentsSayTheLength) {
   }
 }
 
+TEST(HexTextInput, ACommentSaysTheLengthOfTheNextReportAlone) {
+  EXPECT_THAT(readInput("# feature 0xE1, 1023 bytes\n\ne0 0d 05 00 21 40 24\nde 02\n").bytes(),
+              ElementsAre(kSummary, bytesOf("de02")));
+}
+
 TEST(HexTextInput, ATextMayHaveOldBytesBehindItsZero) {
   const std::string text = bytesOf("d0342e372e322d31313833000000000076312e30206f6c640000000000000000");
   for (const std::size_t size : {8u, 16u}) {
